@@ -1,0 +1,112 @@
+#pragma once
+// The main window "Veltrix Zentra Pulse Application" as a presentation model: every control's state,
+// the start-up sequence, the entry rules, the timing rules and Calculate. Views bind to it and call
+// its handlers; it never touches a widget.
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "core/entry_field.h"
+#include "core/pulsed_module.h"
+#include "core/timing_solver.h"
+#include "forms/controls.h"
+#include "forms/interaction.h"
+#include "instruments/bench.h"
+
+namespace zp {
+
+class MainForm {
+public:
+    using SolverFactory = std::function<std::unique_ptr<TimingSolver>()>;
+
+    MainForm(PulsedModule& state, Bench& bench, Interaction& ui,
+             SolverFactory solverFactory = makeDefaultSolver);
+    MainForm(const MainForm&) = delete;
+    MainForm& operator=(const MainForm&) = delete;
+
+    // Start-up steps 2 to 12 on the bench's analyzer. Throws InstrumentError when the analyzer
+    // cannot be reached or answers with an error; the state is then left as it was.
+    void Form_Load();
+
+    // ---- Controls, named as in the window. Rows are indexed 0 .. NumOutputs - 1.
+    Control f_PulsedZentra;  // the window itself: caption and height
+    Control frm_gates, lbl_width, lbl_delay;
+    std::vector<Control> lbl_gate;
+    std::vector<EntryField> VexoEdit_width;
+    std::vector<EntryField> VexoEdit_delay;
+    Control frm_PulsedParams, lbl_prf, lbl_pri, lbl_ifbw;
+    EntryField VexoEdit_prf;
+    EntryField VexoEdit_pri;
+    EntryField VexoEdit_IFBW;
+    CheckBox chk_FixedPRF;
+    Control frm_DutyCycle, lbl_DutyCycle;
+    Control frm_pulsed, b_calculate, b_apply;
+    CheckBox chk_pulsed;
+    Control b_recall, b_save, b_PulseProfile, b_min, b_close;
+
+    MenuEntry m_Config, m_ConfigPG, m_ConfigRx, m_ConverterMeas, m_NoPG, m_NoSWGating;
+    MenuEntry m_View, m_PulseProfile, m_PulseConfig;
+    MenuEntry m_help, m_contents, m_about;
+
+    // ---- Handlers.
+    void b_calculate_Click();
+    void chk_FixedPRF_Click();
+    void chk_pulsed_Click();
+    void m_ConverterMeas_Click();
+    void m_NoPG_Click();
+    void m_NoSWGating_Click();
+    void m_contents_Click();  // help at topic 1114
+    void Invalidate();
+
+    // Sets a check box from code, running its click rule as a user's click does.
+    void setFixedPRF(bool checked);
+
+    // ---- Timing rules.
+    double FMaxPulseWidth() const;
+    double FMaxGateWidth() const;
+    double FMinPulseWidth() const;
+    double FHighestGateDelay() const;
+    bool FPulseWidthOK(double prf);
+    std::int16_t FAutoGain() const;
+    void SUpdateDutyCycle();
+
+    // ---- Entry rules (normally run by the fields' value-changed notifications).
+    void prfRule();
+    void priRule();
+    void ifbwRule();
+    void widthRule(int row);
+    void delayRule(int row);
+    // The significant-digit normalisation of a row's width or delay field.
+    static void SNormalizeValue(EntryField& field);
+
+    // Rows that share a generator output with `row` (the row itself excluded).
+    std::vector<int> sharedRows(int row) const;
+
+    int rowCount() const { return static_cast<int>(VexoEdit_width.size()); }
+    PulsedModule& state() { return state_; }
+    const PulsedModule& state() const { return state_; }
+    Bench& bench() { return bench_; }
+    Interaction& ui() { return ui_; }
+
+    // Views refresh themselves from the model after every change.
+    void onChanged(std::function<void()> listener) { listeners_.push_back(std::move(listener)); }
+    void notifyChanged();
+
+    static constexpr int kHelpTopic = 1114;
+
+private:
+    void buildControls();
+    void addRow(int row);
+    void bindFields();
+    void showResults();
+
+    PulsedModule& state_;
+    Bench& bench_;
+    Interaction& ui_;
+    SolverFactory solverFactory_;
+    std::vector<std::function<void()>> listeners_;
+};
+
+}  // namespace zp
