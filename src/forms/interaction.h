@@ -12,7 +12,7 @@ inline constexpr const char* kAppTitle = "Veltrix Zentra Pulse Application";
 enum class Pointer { Normal, Busy, Wait1, Wait2, Wait3 };
 
 class Interaction {
-public:
+  public:
     virtual ~Interaction() = default;
     // A message box with an OK button only, titled kAppTitle.
     virtual void message(const std::string& text) = 0;
@@ -31,13 +31,13 @@ public:
 
 // Shows the busy pointer for a scope and puts the normal one back at its end.
 class BusyPointer {
-public:
+  public:
     explicit BusyPointer(Interaction& ui) : ui_(ui) { ui_.setPointer(Pointer::Busy); }
     ~BusyPointer() { ui_.setPointer(Pointer::Normal); }
     BusyPointer(const BusyPointer&) = delete;
     BusyPointer& operator=(const BusyPointer&) = delete;
 
-private:
+  private:
     Interaction& ui_;
 };
 

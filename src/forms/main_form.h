@@ -1,9 +1,11 @@
 #pragma once
-// The main window "Veltrix Zentra Pulse Application" as a presentation model: every control's state,
-// the start-up sequence, the entry rules, the timing rules and Calculate. Views bind to it and call
-// its handlers; it never touches a widget.
+// The main window "Veltrix Zentra Pulse Application" as a presentation model: every control's
+// state, the start-up sequence, the entry rules, the timing rules and Calculate. Views bind to it
+// and call its handlers; it never touches a widget.
 
+#include <cstdint>
 #include <functional>
+#include <map>
 #include <memory>
 #include <string>
 #include <vector>
@@ -18,7 +20,7 @@
 namespace zp {
 
 class MainForm {
-public:
+  public:
     using SolverFactory = std::function<std::unique_ptr<TimingSolver>()>;
 
     MainForm(PulsedModule& state, Bench& bench, Interaction& ui,
@@ -50,6 +52,9 @@ public:
     MenuEntry m_View, m_PulseProfile, m_PulseConfig;
     MenuEntry m_help, m_contents, m_about;
 
+    // Where each entry field sits (twips, relative to its frame), by the field's name.
+    std::map<std::string, Geometry> fieldGeometry;
+
     // ---- Handlers.
     void b_calculate_Click();
     void chk_FixedPRF_Click();
@@ -73,13 +78,17 @@ public:
     void SUpdateDutyCycle();
 
     // ---- Entry rules (normally run by the fields' value-changed notifications).
+    // prfRule() is the program's own run (start-up, recall): it never steps the PRF up. The PRF
+    // field's notification runs the same rule with the step-up when the entry came from a step.
     void prfRule();
     void priRule();
     void ifbwRule();
     void widthRule(int row);
     void delayRule(int row);
-    // The significant-digit normalisation of a row's width or delay field.
+    // The significant-digit normalisation of a row's width or delay field; the one-argument form
+    // steps up only when the field's last entry was a step.
     static void SNormalizeValue(EntryField& field);
+    static void SNormalizeValue(EntryField& field, bool fromStep);
 
     // Rows that share a generator output with `row` (the row itself excluded).
     std::vector<int> sharedRows(int row) const;
@@ -96,11 +105,17 @@ public:
 
     static constexpr int kHelpTopic = 1114;
 
-private:
+  private:
     void buildControls();
     void addRow(int row);
     void bindFields();
-    void showResults();
+    void layOutRows(const PulsedModule& filled);
+    void runPrfRule(bool fromStep);
+    void pullBackDelay(EntryField& delay, double prf);
+    void calculateSolution(double desiredPrf);
+    void showResults(double desiredPrf);
+    // Rows the timing rules look at: NumOutputs, never more than the window has.
+    int ruleRows() const;
 
     PulsedModule& state_;
     Bench& bench_;

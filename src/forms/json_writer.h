@@ -1,0 +1,44 @@
+#pragma once
+// A small JSON text builder: objects, arrays, strings escaped, numbers in their shortest
+// round-trip form. Top-level members go one per line so that the text reads well in a terminal.
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace zp {
+
+class JsonWriter {
+  public:
+    void beginObject();
+    void endObject();
+    void beginArray();
+    void endArray();
+    // The next value belongs to this member of the enclosing object.
+    void key(std::string_view name);
+
+    void value(double v);  // non-finite numbers have no JSON form: written as null
+    void value(std::int64_t v);
+    void value(int v) { value(static_cast<std::int64_t>(v)); }
+    void value(bool v);
+    void value(std::string_view v);
+    void value(const char* v) { value(std::string_view(v)); }
+    void null();
+
+    const std::string& text() const { return out_; }
+
+  private:
+    void beforeValue();
+    void open(char bracket);
+    void close(char bracket);
+
+    std::string out_;
+    std::vector<bool> hasMembers_;  // one entry per open object or array
+    bool afterKey_ = false;
+};
+
+// The string as a quoted JSON literal.
+std::string jsonQuoted(std::string_view v);
+
+}  // namespace zp

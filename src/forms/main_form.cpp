@@ -1,0 +1,303 @@
+// The main window's controls, start-up, measurement-mode menus and help.
+
+#include "forms/main_form.h"
+
+#include <algorithm>
+#include <stdexcept>
+#include <utility>
+
+#include "forms/main_form_layout.h"
+#include "instruments/instrument_error.h"
+
+namespace zp {
+
+namespace {
+
+constexpr int kMaxRows = 6;
+constexpr const char* kGateCaptions[] = {
+    "Source Modulation :", "A IF Gate :", "B IF Gate :", "R1 IF Gate :", "R2 IF Gate :"};
+constexpr const char* kFourPortCaptions[] = {
+    "A IF Gate :", "B IF Gate :", "C IF Gate :", "D IF Gate :"};
+constexpr const char* kSixthRowCaption = "R IF Gate :";
+
+Control makeControl(std::string name, std::string caption, Geometry g = {}) {
+    Control c;
+    c.name = std::move(name);
+    c.caption = std::move(caption);
+    c.geometry = g;
+    return c;
+}
+
+MenuEntry makeMenu(std::string name, std::string caption) {
+    MenuEntry m;
+    m.name = std::move(name);
+    m.caption = std::move(caption);
+    return m;
+}
+
+CheckBox makeCheckBox(std::string name, std::string caption, Geometry g, Check16 value) {
+    CheckBox c;
+    c.name = std::move(name);
+    c.caption = std::move(caption);
+    c.geometry = g;
+    c.value = value;
+    return c;
+}
+
+std::string rowName(const char* base, int row) {
+    return std::string(base) + "(" + std::to_string(row) + ")";
+}
+
+Geometry shiftedDown(Geometry g, int by) {
+    g.top += by;
+    return g;
+}
+
+// What start-up learns from the analyzer; counts and the hardware value only for listed models.
+AnalyzerIdentity readIdentity(AnalyzerApplication& app) {
+    AnalyzerIdentity id;
+    id.modelText = app.modelText();
+    id.optionText = app.optionText();
+    std::unique_ptr<AnalyzerCaps> caps = app.hardwareInfo();
+    if (!caps) throw InstrumentError(kOwnCheckError, "The analyzer reports no capability object.");
+    if (isListedModelText(id.modelText)) {
+        id.sourceCount = caps->sourceCount();
+        id.portCount = caps->portCount();
+        id.hardwareValue = caps->hardwareValue();
+    }
+    return id;
+}
+
+}  // namespace
+
+MainForm::MainForm(PulsedModule& state, Bench& bench, Interaction& ui, SolverFactory solverFactory)
+    : state_(state), bench_(bench), ui_(ui), solverFactory_(std::move(solverFactory)) {
+    buildControls();
+}
+
+void MainForm::buildControls() {
+    using namespace layout;
+    f_PulsedZentra = makeControl("f_PulsedZentra", kAppTitle, {0, 0, kWindowWidth, kWindowHeight});
+
+    frm_PulsedParams = makeControl("frm_PulsedParams", "Desired PRF and IFBW", kPulsedParamsFrame);
+    lbl_prf = makeControl("lbl_prf", "Pulse Repetition Frequency :", kPrfLabel);
+    lbl_pri = makeControl("lbl_pri", "Pulse Repetition Interval :", kPriLabel);
+    lbl_ifbw = makeControl("lbl_ifbw", "Receiver IF Bandwidth :", kIfbwLabel);
+    VexoEdit_prf = EntryField("VexoEdit_prf", 5000.0, 0.001, 165000000.0, 3, units::kHertz);
+    VexoEdit_pri = EntryField("VexoEdit_pri", 0.0002, 3.4e-9, 1e18, 3, units::kSeconds);
+    VexoEdit_IFBW = EntryField("VexoEdit_IFBW", 500.0, 1.0, 10000.0, 0, units::kHertz);
+    chk_FixedPRF = makeCheckBox("chk_FixedPRF", "Fixed PRF", kFixedPrfBox, kChecked);
+
+    frm_gates = makeControl("frm_gates", "Modulation/Gates", kGatesFrame);
+    lbl_width = makeControl("lbl_width", "Width", kWidthHeading);
+    lbl_delay = makeControl("lbl_delay", "Delay", kDelayHeading);
+    lbl_gate.clear();
+    VexoEdit_width.clear();
+    VexoEdit_delay.clear();
+    // Room for the sixth row up front, so that growing never moves a field a view is bound to.
+    lbl_gate.reserve(kMaxRows);
+    VexoEdit_width.reserve(kMaxRows);
+    VexoEdit_delay.reserve(kMaxRows);
+    fieldGeometry.clear();
+    for (int row = 0; row < kDesignedRows; ++row) addRow(row);
+
+    frm_DutyCycle = makeControl("frm_DutyCycle", "Duty Cycle", kDutyCycleFrame);
+    lbl_DutyCycle = makeControl("lbl_DutyCycle", "", kDutyCycleLabel);
+    frm_pulsed = makeControl("frm_pulsed", "", kPulsedFrame);
+    b_calculate = makeControl("b_calculate", "Calculate", kCalculateButton);
+    b_apply = makeControl("b_apply", "Apply", kApplyButton);
+    chk_pulsed = makeCheckBox("chk_pulsed", "Pulsed Mode On", kPulsedBox, kChecked);
+
+    const auto button = [](const char* name, const char* caption, int slot) {
+        return makeControl(name, caption,
+                           {kButtonLeft[slot], kButtonTop, kButtonWidth, kButtonHeight});
+    };
+    b_PulseProfile = button("b_PulseProfile", "Pulse Profile", 0);
+    b_recall = button("b_recall", "Recall", 1);
+    b_save = button("b_save", "Save", 2);
+    b_min = button("b_min", "Minimize", 3);
+    b_close = button("b_close", "Close", 4);
+
+    m_Config = makeMenu("m_Config", "&Configure");
+    m_ConfigPG = makeMenu("m_ConfigPG", "&Pulse Generators/Modulators...");
+    m_ConfigRx = makeMenu("m_ConfigRx", "&Receiver Gains...");
+    m_ConverterMeas = makeMenu("m_ConverterMeas", "&Converter Measurements");
+    m_NoPG = makeMenu("m_NoPG", "No Pulse &Generators");
+    m_NoSWGating = makeMenu("m_NoSWGating", "No &SW Gating");
+    m_View = makeMenu("m_View", "&View");
+    m_PulseProfile = makeMenu("m_PulseProfile", "&Pulse Profile...");
+    m_PulseConfig = makeMenu("m_PulseConfig", "Pulse &Configuration...");
+    m_help = makeMenu("m_help", "&Help");
+    m_contents = makeMenu("m_contents", "&Contents...");
+    m_about = makeMenu("m_about", "&About...");
+
+    fieldGeometry[VexoEdit_prf.name()] = kPrfField;
+    fieldGeometry[VexoEdit_pri.name()] = kPriField;
+    fieldGeometry[VexoEdit_IFBW.name()] = kIfbwField;
+    bindFields();
+}
+
+void MainForm::addRow(int row) {
+    const std::string caption =
+        row < layout::kDesignedRows ? kGateCaptions[row] : std::string(kSixthRowCaption);
+    lbl_gate.push_back(makeControl(rowName("lbl_gate", row), caption, layout::gateLabel(row)));
+    VexoEdit_width.emplace_back(rowName("VexoEdit_width", row), 1e-6, 3.4e-9, 1e18, 3,
+                                units::kSeconds);
+    VexoEdit_delay.emplace_back(rowName("VexoEdit_delay", row), 0.0, 0.0, 1.0, 3, units::kSeconds);
+    fieldGeometry[VexoEdit_width.back().name()] = layout::widthField(row);
+    fieldGeometry[VexoEdit_delay.back().name()] = layout::delayField(row);
+}
+
+void MainForm::bindFields() {
+    VexoEdit_prf.onValueChanged([this] {
+        runPrfRule(VexoEdit_prf.stepProperty() != 1);
+        notifyChanged();
+    });
+    VexoEdit_pri.onValueChanged([this] {
+        priRule();
+        notifyChanged();
+    });
+    VexoEdit_IFBW.onValueChanged([this] {
+        ifbwRule();
+        notifyChanged();
+    });
+    for (int row = 0; row < rowCount(); ++row) {
+        VexoEdit_width[row].onValueChanged([this, row] {
+            widthRule(row);
+            notifyChanged();
+        });
+        VexoEdit_delay[row].onValueChanged([this, row] {
+            delayRule(row);
+            notifyChanged();
+        });
+    }
+}
+
+void MainForm::notifyChanged() {
+    for (const auto& listener : listeners_) listener();
+}
+
+int MainForm::ruleRows() const {
+    return std::clamp<int>(state_.NumOutputs, 0, rowCount());
+}
+
+// ---- Start-up.
+
+void MainForm::Form_Load() {
+    // Everything the analyzer can fail on happens before the state or a control is touched.
+    PulsedModule filled = state_;
+    {
+        std::unique_ptr<AnalyzerApplication> app = bench_.connectAnalyzer();
+        if (!app) throw InstrumentError(kOwnCheckError, "The analyzer cannot be reached.");
+        fillAtStartup(filled, readIdentity(*app));
+    }
+    state_ = std::move(filled);
+
+    buildControls();
+    layOutRows(state_);
+    chk_FixedPRF.value = isTrue(state_.FixedPRF) ? kChecked : kUnchecked;
+
+    if (!state_.hasKnownLayout()) m_NoSWGating.enabled = false;
+
+    state_.NeedsCalculation = kTrue;
+    b_apply.enabled = false;
+    m_PulseProfile.enabled = false;
+    b_PulseProfile.enabled = false;
+
+    for (int row = 0; row < ruleRows(); ++row) {
+        SNormalizeValue(VexoEdit_width[row], false);
+        SNormalizeValue(VexoEdit_delay[row], false);
+    }
+    runPrfRule(false);
+
+    m_PulseConfig.visible = state_.hasKnownLayout();
+    m_PulseConfig.enabled = state_.hasKnownLayout();
+    notifyChanged();
+}
+
+void MainForm::layOutRows(const PulsedModule& filled) {
+    if (!filled.isFourPort()) return;  // the designed five rows stay as they are
+    for (int row = 1; row <= 4; ++row) lbl_gate[row].caption = kFourPortCaptions[row - 1];
+    while (rowCount() < filled.NumOutputs && rowCount() < kMaxRows) addRow(rowCount());
+    bindFields();
+
+    const int grow = layout::kRowPitch * (rowCount() - layout::kDesignedRows);
+    frm_gates.geometry.height = layout::kGatesFrame.height + grow;
+    frm_DutyCycle.geometry = shiftedDown(layout::kDutyCycleFrame, grow);
+    frm_pulsed.geometry = shiftedDown(layout::kPulsedFrame, grow);
+    for (Control* b : {&b_PulseProfile, &b_min, &b_save, &b_recall, &b_close})
+        b->geometry.top = layout::kButtonTop + grow;
+    f_PulsedZentra.geometry.height = layout::kWindowHeight + grow;
+}
+
+// ---- Check boxes and measurement-mode menus.
+
+void MainForm::chk_FixedPRF_Click() {
+    state_.FixedPRF = toBool16(chk_FixedPRF.checked());
+    notifyChanged();
+}
+
+void MainForm::setFixedPRF(bool checked) {
+    chk_FixedPRF.value = checked ? kChecked : kUnchecked;
+    chk_FixedPRF_Click();
+}
+
+// Apply reads the box when it runs; nothing else depends on it.
+void MainForm::chk_pulsed_Click() {
+    notifyChanged();
+}
+
+void MainForm::Invalidate() {
+    state_.NeedsCalculation = kTrue;
+    b_apply.enabled = false;
+    m_PulseProfile.enabled = false;
+    b_PulseProfile.enabled = false;
+}
+
+void MainForm::m_NoSWGating_Click() {
+    m_NoSWGating.checked = !m_NoSWGating.checked;
+    Invalidate();
+    notifyChanged();
+}
+
+void MainForm::m_ConverterMeas_Click() {
+    m_ConverterMeas.checked = !m_ConverterMeas.checked;
+    state_.NeedsCalculation = kTrue;
+    if (b_apply.enabled) b_apply.enabled = false;
+    notifyChanged();
+}
+
+void MainForm::m_NoPG_Click() {
+    m_NoPG.checked = !m_NoPG.checked;
+    if (m_NoPG.checked) {
+        b_PulseProfile.enabled = false;
+        m_PulseProfile.enabled = false;
+        m_ConfigPG.enabled = false;
+        frm_gates.enabled = false;
+    } else {
+        m_ConfigPG.enabled = true;
+        frm_gates.enabled = true;
+    }
+    state_.NeedsCalculation = kTrue;
+    notifyChanged();
+}
+
+// ---- Help.
+
+void MainForm::m_contents_Click() {
+    std::string file;
+    try {
+        std::unique_ptr<AnalyzerApplication> app = bench_.connectAnalyzer();
+        if (!app) throw InstrumentError(kOwnCheckError, "The analyzer cannot be reached.");
+        std::unique_ptr<CommandParser> parser = app->commandParser();
+        if (!parser) throw InstrumentError(kOwnCheckError, "The analyzer has no command parser.");
+        file = parser->parse("DIAG:HELP:FILE?");
+    } catch (const std::exception& e) {
+        ui_.message(e.what());
+        return;
+    }
+    std::erase_if(file, [](char c) { return c == '"' || c == '\n' || c == '\r'; });
+    ui_.showHelp(file, kHelpTopic);
+}
+
+}  // namespace zp
