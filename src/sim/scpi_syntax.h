@@ -1,0 +1,66 @@
+#pragma once
+// Lexical pieces of SCPI program messages shared by the simulated instruments: keyword matching,
+// header nodes, numbers with unit suffixes and the standard error entries.
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace zp::sim {
+
+struct ScpiErrorCode {
+    int code;
+    const char* text;
+};
+
+inline constexpr ScpiErrorCode kSyntaxError{-102, "Syntax error"};
+inline constexpr ScpiErrorCode kParameterNotAllowed{-108, "Parameter not allowed"};
+inline constexpr ScpiErrorCode kMissingParameter{-109, "Missing parameter"};
+inline constexpr ScpiErrorCode kUndefinedHeader{-113, "Undefined header"};
+inline constexpr ScpiErrorCode kHeaderSuffixOutOfRange{-114, "Header suffix out of range"};
+inline constexpr ScpiErrorCode kInvalidSuffix{-131, "Invalid suffix"};
+inline constexpr ScpiErrorCode kDataOutOfRange{-222, "Data out of range"};
+inline constexpr ScpiErrorCode kIllegalParameterValue{-224, "Illegal parameter value"};
+inline constexpr ScpiErrorCode kQueueOverflow{-350, "Queue overflow"};
+
+// The queue entry text, e.g. -113,"Undefined header".
+std::string errorEntry(ScpiErrorCode error);
+
+// Thrown by the parsing helpers; the instrument queues the code.
+struct ScpiFailure {
+    ScpiErrorCode error;
+};
+
+// True when word (any case) is the short or the long form of keyword, whose upper-case letters
+// are the short form: "OUTPut" matches "outp" and "OUTPUT", not "OUTPU".
+bool matchesKeyword(std::string_view word, std::string_view keyword);
+
+// A header node such as "WIDT2": the mnemonic and its numeric suffix (absent when not written).
+struct HeaderNode {
+    std::string mnemonic;
+    std::optional<int> suffix;
+};
+
+// Splits a program header like ":SOUR:PULS:WIDT1?" into nodes; a leading colon is optional.
+// Throws ScpiFailure (syntax error) for empty nodes or stray characters.
+struct ProgramHeader {
+    std::vector<HeaderNode> nodes;
+    bool query = false;
+};
+ProgramHeader parseHeader(std::string_view header);
+
+enum class ScpiUnit { none, second, hertz, volt, ohm };
+
+// Parses a decimal number in fixed or exponent form with an optional unit suffix of the given
+// kind ("100NS", "10MHZ", "1.5E-06", "2.5 V"). Throws ScpiFailure: syntax error for junk,
+// invalid suffix for a suffix that does not fit the unit.
+double parseNumber(std::string_view text, ScpiUnit unit);
+
+// ON/OFF/1/0. Throws ScpiFailure (illegal parameter value) for anything else.
+bool parseBoolean(std::string_view text);
+
+std::string trim(std::string_view text);
+std::string upper(std::string_view text);
+
+}  // namespace zp::sim
