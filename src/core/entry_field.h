@@ -16,7 +16,8 @@ struct Unit {
     double multiplier = 1.0;
 };
 
-// Parses "sec 1.e0 msec 1.e-3 ..." into its pairs; throws std::invalid_argument on a malformed list.
+// Parses "sec 1.e0 msec 1.e-3 ..." into its pairs; throws std::invalid_argument on a malformed
+// list.
 std::vector<Unit> parseUnitList(std::string_view list);
 
 namespace units {
@@ -31,7 +32,7 @@ inline constexpr const char* kPlain = ". 1.e0";
 enum class ChangeSource { Program, Typed, Step };
 
 class EntryField {
-public:
+  public:
     EntryField() = default;
     EntryField(std::string name, double value, double lower, double upper, int decimals,
                std::string unitList);
@@ -70,11 +71,13 @@ public:
 
     // The value in the most readable unit of the list, e.g. "100 usec".
     std::string displayText() const;
+    // Any value written the same way (used in the field's messages).
+    std::string textWithUnit(double v) const;
 
     using Listener = std::function<void()>;
     void onValueChanged(Listener l) { listener_ = std::move(l); }
 
-private:
+  private:
     std::string name_;
     double value_ = 0.0;
     double lower_ = 0.0;

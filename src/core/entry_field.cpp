@@ -1,0 +1,257 @@
+#include "core/entry_field.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <stdexcept>
+
+#include "core/decimal_digits.h"
+#include "core/numeric.h"
+
+namespace zp {
+
+namespace {
+
+constexpr std::string_view kBlanks = " \t\r\n";
+
+std::string_view trim(std::string_view s) {
+    const auto first = s.find_first_not_of(kBlanks);
+    if (first == std::string_view::npos) return {};
+    return s.substr(first, s.find_last_not_of(kBlanks) - first + 1);
+}
+
+char lower(char c) {
+    return (c >= 'A' && c <= 'Z') ? static_cast<char>(c - 'A' + 'a') : c;
+}
+
+bool equalsIgnoreCase(std::string_view a, std::string_view b) {
+    return a.size() == b.size() && std::equal(a.begin(), a.end(), b.begin(),
+                                              [](char x, char y) { return lower(x) == lower(y); });
+}
+
+// Both micro signs become 'u' so that "µs" and "μsec" read as "us".
+std::string asciiMicro(std::string_view s) {
+    std::string out(s);
+    for (const std::string_view micro : {"\xC2\xB5", "\xCE\xBC"}) {
+        for (auto pos = out.find(micro); pos != std::string::npos; pos = out.find(micro)) {
+            out.replace(pos, micro.size(), "u");
+        }
+    }
+    return out;
+}
+
+// The length of the leading number: sign, digits with one point, and an exponent only when
+// digits follow the 'e'.
+std::size_t numberPrefixLength(std::string_view s) {
+    std::size_t i = 0;
+    if (i < s.size() && (s[i] == '+' || s[i] == '-')) ++i;
+    bool point = false;
+    while (i < s.size() && ((s[i] >= '0' && s[i] <= '9') || (s[i] == '.' && !point))) {
+        if (s[i] == '.') point = true;
+        ++i;
+    }
+    if (i < s.size() && (s[i] == 'e' || s[i] == 'E')) {
+        std::size_t j = i + 1;
+        if (j < s.size() && (s[j] == '+' || s[j] == '-')) ++j;
+        if (j < s.size() && s[j] >= '0' && s[j] <= '9') {
+            while (j < s.size() && s[j] >= '0' && s[j] <= '9') ++j;
+            i = j;
+        }
+    }
+    return i;
+}
+
+std::optional<double> siMultiplier(char c) {
+    switch (c) {
+        case 'p':
+            return 1e-12;
+        case 'n':
+            return 1e-9;
+        case 'u':
+            return 1e-6;
+        case 'm':
+            return 1e-3;
+        case 'k':
+        case 'K':
+            return 1e3;
+        case 'M':
+            return 1e6;
+        case 'G':
+            return 1e9;
+        default:
+            return std::nullopt;
+    }
+}
+
+// "sec" is also written "s", "msec" "ms" and so on.
+std::optional<std::string> shortForm(const std::string& name) {
+    if (name.size() >= 3 && name.compare(name.size() - 3, 3, "sec") == 0) {
+        return name.substr(0, name.size() - 2);
+    }
+    return std::nullopt;
+}
+
+bool isPlainList(const std::vector<Unit>& units) {
+    return units.empty() || (units.size() == 1 && units[0].name == ".");
+}
+
+std::string sixDigits(double v) {
+    const auto d = DecimalDigits::significant(v, 6);
+    return generalText(parseNumber(d.exponentText()).value_or(v));
+}
+
+}  // namespace
+
+std::vector<Unit> parseUnitList(std::string_view list) {
+    std::vector<std::string_view> words;
+    for (std::size_t i = list.find_first_not_of(kBlanks); i != std::string_view::npos;) {
+        const auto end = list.find_first_of(kBlanks, i);
+        words.push_back(list.substr(i, end == std::string_view::npos ? end : end - i));
+        i = end == std::string_view::npos ? end : list.find_first_not_of(kBlanks, end);
+    }
+    if (words.size() % 2 != 0) {
+        throw std::invalid_argument("unit list '" + std::string(list) +
+                                    "' has a name without a multiplier");
+    }
+    std::vector<Unit> units;
+    for (std::size_t i = 0; i < words.size(); i += 2) {
+        const auto m = parseNumber(words[i + 1]);
+        if (!m || *m <= 0) {
+            throw std::invalid_argument("unit list '" + std::string(list) + "': '" +
+                                        std::string(words[i + 1]) +
+                                        "' is not a positive multiplier");
+        }
+        units.push_back(Unit{std::string(words[i]), *m});
+    }
+    return units;
+}
+
+EntryField::EntryField(std::string name, double value, double lower, double upper, int decimals,
+                       std::string unitList)
+    : name_(std::move(name)),
+      lower_(lower),
+      upper_(upper),
+      decimals_(decimals),
+      unitListText_(std::move(unitList)),
+      units_(parseUnitList(unitListText_)) {
+    if (!std::isfinite(lower) || !std::isfinite(upper) || lower > upper) {
+        throw std::invalid_argument("field " + name_ + " has an empty range");
+    }
+    value_ = std::isnan(value) ? lower_ : std::clamp(value, lower_, upper_);
+}
+
+void EntryField::setValue(double v) {
+    if (std::isnan(v)) return;
+    value_ = std::clamp(v, lower_, upper_);
+    lastSource_ = ChangeSource::Program;
+}
+
+std::optional<std::string> EntryField::enter(double v, ChangeSource source) {
+    if (!enabled_) return name_ + " is disabled";
+    if (!std::isfinite(v)) return std::string("the value is not a finite number");
+    if (v < lower_ || v > upper_) {
+        return textWithUnit(v) + " is outside " + textWithUnit(lower_) + " to " +
+               textWithUnit(upper_);
+    }
+    value_ = v;
+    lastSource_ = source;
+    // A copy, so a listener that replaces itself does not pull the rug from under the call.
+    if (listener_) {
+        const Listener l = listener_;
+        l();
+    }
+    return std::nullopt;
+}
+
+std::optional<std::string> EntryField::enterText(std::string_view text) {
+    const Parsed p = parse(text);
+    if (!p.value) return p.error;
+    return enter(*p.value, ChangeSource::Typed);
+}
+
+std::optional<std::string> EntryField::step(int direction) {
+    if (direction == 0) return std::string("a step needs a direction");
+    double unit = 0.0;
+    if (value_ == 0.0) {
+        // From zero the smallest unit of the list is the natural first step.
+        unit = 1.0;
+        for (const auto& u : units_) unit = std::min(unit, u.multiplier);
+    } else {
+        unit = std::pow(10.0, DecimalDigits::significant(value_, 15).exponent - 2);
+    }
+    const double raw = value_ + (direction > 0 ? unit : -unit);
+    // Through the decimal text, so 1e-6 + 1e-8 is exactly the double nearest 1.01e-6.
+    const double next = parseNumber(generalText(raw)).value_or(raw);
+    return enter(std::clamp(next, lower_, upper_), ChangeSource::Step);
+}
+
+EntryField::Parsed EntryField::parse(std::string_view text) const {
+    const std::string_view t = trim(text);
+    const std::size_t numberLength = numberPrefixLength(t);
+    const auto number = parseNumber(t.substr(0, numberLength));
+    if (!number) return {std::nullopt, "'" + std::string(t) + "' is not a number"};
+
+    const std::string rest = asciiMicro(trim(t.substr(numberLength)));
+    const auto accept = [&](double multiplier) -> Parsed {
+        const double v = *number * multiplier;
+        if (!std::isfinite(v)) return {std::nullopt, "'" + std::string(t) + "' is too large"};
+        return {v, {}};
+    };
+    if (rest.empty()) return accept(1.0);
+
+    // A unit of the list: exact first, so "M" (mega) and "m" stay apart, then ignoring case.
+    for (const auto& u : units_) {
+        if (u.name == rest || shortForm(u.name) == rest) return accept(u.multiplier);
+    }
+    for (const auto& u : units_) {
+        if (u.name.size() > 1 && equalsIgnoreCase(u.name, rest)) return accept(u.multiplier);
+        const auto s = shortForm(u.name);
+        if (s && s->size() > 1 && equalsIgnoreCase(*s, rest)) return accept(u.multiplier);
+    }
+    // A multiplier letter, optionally followed by the base unit: "10k", "10 kohm", "2.5us".
+    if (const auto m = siMultiplier(rest[0])) {
+        const std::string_view tail = std::string_view(rest).substr(1);
+        bool ok = tail.empty();
+        for (const auto& u : units_) {
+            if (u.multiplier != 1.0 || u.name == ".") continue;
+            const auto s = shortForm(u.name);
+            if (equalsIgnoreCase(u.name, tail) || (s && equalsIgnoreCase(*s, tail))) ok = true;
+        }
+        if (ok) return accept(*m);
+    }
+
+    std::string hint;
+    if (isPlainList(units_)) {
+        hint = "enter a plain number";
+    } else {
+        hint = "use ";
+        for (std::size_t i = 0; i < units_.size(); ++i) {
+            hint += (i ? ", " : "") + units_[i].name;
+        }
+    }
+    return {std::nullopt, "unknown unit '" + rest + "' (" + hint + ")"};
+}
+
+std::string EntryField::textWithUnit(double v) const {
+    if (!std::isfinite(v)) return generalText(v);
+    if (isPlainList(units_)) return sixDigits(v);
+    const Unit* chosen = &units_.front();
+    if (v != 0.0) {
+        const Unit* smallest = nullptr;
+        const Unit* best = nullptr;
+        for (const auto& u : units_) {
+            if (!smallest || u.multiplier < smallest->multiplier) smallest = &u;
+            if (u.multiplier <= std::fabs(v) && (!best || u.multiplier > best->multiplier)) {
+                best = &u;
+            }
+        }
+        chosen = best ? best : smallest;
+    }
+    return sixDigits(v / chosen->multiplier) + " " + chosen->name;
+}
+
+std::string EntryField::displayText() const {
+    return textWithUnit(value_);
+}
+
+}  // namespace zp
