@@ -52,21 +52,28 @@ double inRange(double value, double low, double high) {
     return value;
 }
 
-// Picks the keyword that the parameter names (its short form is stored) or fails with -224.
-std::string enumeration(const std::string& param, std::initializer_list<const char*> keywords) {
-    for (const char* keyword : keywords) {
-        if (matchesKeyword(trim(param), keyword)) {
-            std::string shortForm;
-            for (const char* k = keyword;
-                 *k != '\0' && std::isupper(static_cast<unsigned char>(*k)); ++k) {
-                shortForm += *k;
-            }
-            // Keywords carrying a digit (INT2) are stored whole.
-            for (const char* k = keyword; *k != '\0'; ++k) {
-                if (std::isdigit(static_cast<unsigned char>(*k)) != 0) shortForm += *k;
-            }
-            return shortForm;
+// Picks the keyword that the parameter names and returns its short form (with its digit, as in
+// INT2), or fails with -224.
+std::string enumeration(const std::string& param,
+                        std::initializer_list<std::string_view> keywords) {
+    const std::string word = trim(param);
+    const auto digitsOf = [](std::string_view text) {
+        std::size_t i = text.size();
+        while (i > 0 && std::isdigit(static_cast<unsigned char>(text[i - 1])) != 0) --i;
+        return i;
+    };
+    const std::size_t wordDigits = digitsOf(word);
+    for (std::string_view keyword : keywords) {
+        const std::size_t keyDigits = digitsOf(keyword);
+        if (word.substr(wordDigits) != keyword.substr(keyDigits)) continue;
+        const std::string_view mnemonic = keyword.substr(0, keyDigits);
+        if (!matchesKeyword(std::string_view(word).substr(0, wordDigits), mnemonic)) continue;
+        std::string shortForm;
+        for (char k : mnemonic) {
+            if (std::isupper(static_cast<unsigned char>(k)) == 0) break;
+            shortForm += k;
         }
+        return shortForm + std::string(keyword.substr(keyDigits));
     }
     throw ScpiFailure{kIllegalParameterValue};
 }
