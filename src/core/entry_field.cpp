@@ -4,6 +4,7 @@
 #include <charconv>
 #include <cmath>
 #include <stdexcept>
+#include <system_error>
 
 #include "core/decimal_digits.h"
 #include "core/numeric.h"
@@ -89,6 +90,30 @@ std::optional<std::string> shortForm(const std::string& name) {
         return name.substr(0, name.size() - 2);
     }
     return std::nullopt;
+}
+
+// The exponent k when m is exactly 10^k.
+std::optional<int> powerOfTen(double m) {
+    const double k = std::round(std::log10(m));
+    if (std::fabs(k) > 300) return std::nullopt;
+    const auto exact = parseNumber("1e" + std::to_string(static_cast<int>(k)));
+    if (!exact || *exact != m) return std::nullopt;
+    return static_cast<int>(k);
+}
+
+// number x 10^k computed on the decimal text, so "2.5 us" is exactly the double nearest 2.5e-6.
+std::optional<double> scaledDecimal(std::string_view number, int k) {
+    const auto e = number.find_first_of("eE");
+    long exponent = k;
+    if (e != std::string_view::npos) {
+        long own = 0;
+        const char* first = number.data() + e + 1;
+        if (first != number.data() + number.size() && *first == '+') ++first;
+        const auto res = std::from_chars(first, number.data() + number.size(), own);
+        if (res.ec != std::errc{} || own > 100000 || own < -100000) return std::nullopt;
+        exponent += own;
+    }
+    return parseNumber(std::string(number.substr(0, e)) + "e" + std::to_string(exponent));
 }
 
 bool isPlainList(const std::vector<Unit>& units) {
@@ -193,7 +218,10 @@ EntryField::Parsed EntryField::parse(std::string_view text) const {
 
     const std::string rest = asciiMicro(trim(t.substr(numberLength)));
     const auto accept = [&](double multiplier) -> Parsed {
-        const double v = *number * multiplier;
+        std::optional<double> exact;
+        if (const auto k = powerOfTen(multiplier))
+            exact = scaledDecimal(t.substr(0, numberLength), *k);
+        const double v = exact ? *exact : *number * multiplier;
         if (!std::isfinite(v)) return {std::nullopt, "'" + std::string(t) + "' is too large"};
         return {v, {}};
     };
