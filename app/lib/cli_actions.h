@@ -1,0 +1,67 @@
+#pragma once
+// The headless front end's actions: a table of named actions, each parsing its own words and
+// running against the main window model. New actions slot into the table.
+
+#include <functional>
+#include <ostream>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "console_interaction.h"
+#include "forms/main_form.h"
+
+namespace zp::app {
+
+// A command line that cannot be run, or an action that failed; the text is for the user.
+class ActionError : public std::runtime_error {
+  public:
+    using std::runtime_error::runtime_error;
+};
+
+struct ActionContext {
+    MainForm& form;
+    ConsoleInteraction& ui;
+    std::ostream& out;
+};
+
+// One parsed action, ready to run.
+struct Action {
+    std::string words;  // as given, for messages
+    // Runs and returns the echo line (empty for none). Throws ActionError on failure.
+    std::function<std::string(ActionContext&)> run;
+    // A message box during the action means it failed (the model reports trouble that way).
+    bool messageFails = true;
+};
+
+// The words an action takes, one after another.
+class WordCursor {
+  public:
+    explicit WordCursor(const std::vector<std::string>& words) : words_(words) {}
+    bool atEnd() const { return pos_ >= words_.size(); }
+    const std::string& peek() const { return words_.at(pos_); }
+    // The next word; throws ActionError "<action>: missing <what>" at the end.
+    const std::string& next(const std::string& action, const std::string& what);
+    std::size_t position() const { return pos_; }
+
+  private:
+    const std::vector<std::string>& words_;
+    std::size_t pos_ = 0;
+};
+
+struct ActionSpec {
+    std::string name;
+    std::string usage;
+    std::function<Action(WordCursor&)> parse;  // the action's name has been taken already
+};
+
+const std::vector<ActionSpec>& actionTable();
+
+// Parses every action before any runs, so that a typing error costs nothing.
+std::vector<Action> parseActions(const std::vector<std::string>& words);
+
+// Runs the actions in order and echoes each on `ctx.out`. The first failure is printed on `err`
+// as "zentra-pulse-cli: <action>: <reason>" and ends the run; returns the exit status (0 or 1).
+int runActions(const std::vector<Action>& actions, ActionContext& ctx, std::ostream& err);
+
+}  // namespace zp::app

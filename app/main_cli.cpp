@@ -1,0 +1,69 @@
+// zentra-pulse-cli: the main window without a screen. Runs the given actions in order.
+
+#include <iostream>
+#include <string>
+#include <vector>
+
+#include "forms/main_form.h"
+#include "instruments/instrument_error.h"
+#include "lib/bench_options.h"
+#include "lib/cli_actions.h"
+#include "lib/console_interaction.h"
+
+int main(int argc, char** argv) {
+    using namespace zp::app;
+    const std::vector<std::string> args(argv + 1, argv + argc);
+    ParsedCommandLine cmd = parseCommandLine(args, Program::Cli);
+    if (!cmd.error.empty()) {
+        std::cerr << "zentra-pulse-cli: " << cmd.error << "\nTry 'zentra-pulse-cli --help'.\n";
+        return kUsageExit;
+    }
+    const BenchOptions& options = cmd.options;
+    if (options.help) {
+        std::cout << usageText(Program::Cli);
+        return 0;
+    }
+    if (options.version) {
+        std::cout << versionText(Program::Cli);
+        return 0;
+    }
+    if (options.listModels) {
+        std::cout << modelListText();
+        return 0;
+    }
+    if (cmd.rest.empty()) {
+        std::cerr << "zentra-pulse-cli: no action given\nTry 'zentra-pulse-cli --help'.\n";
+        return kUsageExit;
+    }
+
+    std::vector<Action> actions;
+    try {
+        actions = parseActions(cmd.rest);
+    } catch (const ActionError& e) {
+        std::cerr << "zentra-pulse-cli: " << e.what() << '\n';
+        return 1;
+    }
+
+    std::unique_ptr<zp::sim::SimBench> bench;
+    try {
+        bench = makeBench(options);
+    } catch (const std::exception& e) {
+        std::cerr << "zentra-pulse-cli: " << e.what() << '\n';
+        return kUsageExit;
+    }
+
+    ConsoleInteraction ui(std::cout, options.yes);
+    zp::MainForm form(zp::pulsedModule(), *bench, ui);
+    try {
+        form.Form_Load();
+    } catch (const zp::InstrumentError& e) {
+        std::cerr << "zentra-pulse-cli: the analyzer cannot be reached: " << e.description()
+                  << '\n';
+        return 1;
+    } catch (const std::exception& e) {
+        std::cerr << "zentra-pulse-cli: start-up failed: " << e.what() << '\n';
+        return 1;
+    }
+    ActionContext ctx{form, ui, std::cout};
+    return runActions(actions, ctx, std::cerr);
+}

@@ -1,0 +1,101 @@
+// zentra-pulse: the Qt front end. One instance per user; a second start brings the first to the
+// front and ends.
+
+#include <QApplication>
+#include <QDir>
+#include <QPixmap>
+#include <QTimer>
+#include <iostream>
+#include <string>
+#include <vector>
+
+#include "forms/main_form.h"
+#include "instruments/instrument_error.h"
+#include "lib/bench_options.h"
+#include "ui/main_window.h"
+#include "ui/qt_interaction.h"
+#include "ui/single_instance.h"
+
+namespace {
+
+// Where help files may come from: the manual in the source tree, the installed one, and the one
+// installed beside this program when the installation was moved.
+QStringList manualFolders() {
+    return {QStringLiteral(ZP_HELP_DIR_BUILD), QStringLiteral(ZP_HELP_DIR_INSTALL),
+            QDir(QCoreApplication::applicationDirPath())
+                .absoluteFilePath(QStringLiteral("../share/zentra-pulse/help"))};
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    using namespace zp::app;
+    const std::vector<std::string> args(argv + 1, argv + argc);
+    ParsedCommandLine cmd = parseCommandLine(args, Program::Gui);
+    if (!cmd.error.empty()) {
+        std::cerr << "zentra-pulse: " << cmd.error << "\nTry 'zentra-pulse --help'.\n";
+        return kUsageExit;
+    }
+    const BenchOptions& options = cmd.options;
+    if (options.help) {
+        std::cout << usageText(Program::Gui);
+        return 0;
+    }
+    if (options.version) {
+        std::cout << versionText(Program::Gui);
+        return 0;
+    }
+    if (options.listModels) {
+        std::cout << modelListText();
+        return 0;
+    }
+
+    QApplication app(argc, argv);
+    QApplication::setApplicationName(QStringLiteral("zentra-pulse"));
+    QApplication::setApplicationVersion(QStringLiteral(ZP_VERSION));
+
+    // A second start hands over before anything else runs. A screenshot run stands alone.
+    zp::ui::SingleInstance instance(zp::ui::SingleInstance::defaultKey());
+    if (!options.screenshot && instance.start() == zp::ui::SingleInstance::Role::Secondary) {
+        return 0;
+    }
+
+    std::unique_ptr<zp::sim::SimBench> bench;
+    try {
+        bench = makeBench(options);
+    } catch (const std::exception& e) {
+        std::cerr << "zentra-pulse: " << e.what() << '\n';
+        return kUsageExit;
+    }
+
+    zp::ui::QtInteraction ui(manualFolders());
+    ui.setUnattended(options.screenshot.has_value());
+    zp::MainForm form(zp::pulsedModule(), *bench, ui);
+    try {
+        form.Form_Load();
+    } catch (const zp::InstrumentError& e) {
+        ui.message("The analyzer cannot be reached: " + e.description() + "\nThe program ends.");
+        return 1;
+    } catch (const std::exception& e) {
+        ui.message(std::string("The program could not start: ") + e.what());
+        return 1;
+    }
+
+    zp::ui::MainWindow window(form, ui);
+    ui.setWindow(&window);
+    QObject::connect(&instance, &zp::ui::SingleInstance::raiseRequested, &window, [&window] {
+        std::cerr << "zentra-pulse: raised by a second start" << std::endl;
+        window.bringToFront();
+    });
+    window.show();
+
+    if (options.screenshot) {
+        const QString file = QString::fromStdString(*options.screenshot);
+        QTimer::singleShot(300, &window, [&window, file] {
+            const bool saved = window.grab().save(file, "PNG");
+            if (!saved) std::cerr << "zentra-pulse: cannot write " << file.toStdString() << '\n';
+            QApplication::exit(saved ? 0 : 1);
+        });
+    }
+    return QApplication::exec();
+}

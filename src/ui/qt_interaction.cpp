@@ -1,0 +1,118 @@
+#include "ui/qt_interaction.h"
+
+#include <QApplication>
+#include <QCoreApplication>
+#include <QCursor>
+#include <QFileDialog>
+#include <QMessageBox>
+#include <QWidget>
+#include <iostream>
+
+namespace zp::ui {
+
+QString qtFileFilter(const std::string& filter) {
+    const QStringList parts = QString::fromStdString(filter).split(QLatin1Char('|'));
+    QStringList entries;
+    for (qsizetype i = 0; i < parts.size(); i += 2) {
+        const QString description = parts[i].trimmed();
+        const QString patterns = i + 1 < parts.size() ? parts[i + 1].trimmed().replace(
+                                                            QLatin1Char(';'), QLatin1Char(' '))
+                                                      : QString();
+        if (description.isEmpty() && patterns.isEmpty()) continue;
+        // Qt takes the patterns from the parentheses, so a description that names them already
+        // is used as it is.
+        if (patterns.isEmpty() || description.contains(QLatin1Char('('))) {
+            entries << description;
+        } else {
+            entries << QStringLiteral("%1 (%2)").arg(description, patterns);
+        }
+    }
+    return entries.join(QStringLiteral(";;"));
+}
+
+QtInteraction::QtInteraction(QStringList manualFolders)
+    : manualFolders_(std::move(manualFolders)) {}
+
+QtInteraction::~QtInteraction() {
+    if (pointer_ != Pointer::Normal) QApplication::restoreOverrideCursor();
+}
+
+void QtInteraction::message(const std::string& text) {
+    lastMessage_ = QString::fromStdString(text);
+    if (unattended_) {
+        std::cerr << "zentra-pulse: message: " << text << std::endl;
+        return;
+    }
+    // The person must be able to read it: the busy pointer gives way while the box is up.
+    const Pointer saved = pointer_;
+    setPointer(Pointer::Normal);
+    QMessageBox box(QMessageBox::Information, QString::fromUtf8(kAppTitle), lastMessage_,
+                    QMessageBox::Ok, window_);
+    box.exec();
+    setPointer(saved);
+}
+
+bool QtInteraction::ask(const std::string& text) {
+    if (unattended_) {
+        std::cerr << "zentra-pulse: question: " << text << " -> no" << std::endl;
+        return false;
+    }
+    const Pointer saved = pointer_;
+    setPointer(Pointer::Normal);
+    const auto answer =
+        QMessageBox::question(window_, QString::fromUtf8(kAppTitle), QString::fromStdString(text),
+                              QMessageBox::Yes | QMessageBox::No);
+    setPointer(saved);
+    return answer == QMessageBox::Yes;
+}
+
+std::optional<std::string> QtInteraction::chooseOpenFile(const std::string& filter) {
+    if (unattended_) return std::nullopt;
+    const QString file =
+        QFileDialog::getOpenFileName(window_, QString::fromUtf8(kAppTitle),
+                                     QCoreApplication::applicationDirPath(), qtFileFilter(filter));
+    if (file.isEmpty()) return std::nullopt;
+    return file.toStdString();
+}
+
+std::optional<std::string> QtInteraction::chooseSaveFile(const std::string& filter) {
+    if (unattended_) return std::nullopt;
+    const QString file =
+        QFileDialog::getSaveFileName(window_, QString::fromUtf8(kAppTitle),
+                                     QCoreApplication::applicationDirPath(), qtFileFilter(filter));
+    if (file.isEmpty()) return std::nullopt;
+    return file.toStdString();
+}
+
+void QtInteraction::processEvents() {
+    QCoreApplication::processEvents();
+}
+
+void QtInteraction::setPointer(Pointer p) {
+    if (p == pointer_) return;
+    // One override at most is ours, so that nesting can never leave a stuck hourglass.
+    if (p == Pointer::Normal) {
+        QApplication::restoreOverrideCursor();
+    } else if (pointer_ == Pointer::Normal) {
+        QApplication::setOverrideCursor(QCursor(Qt::WaitCursor));
+    } else {
+        QApplication::changeOverrideCursor(QCursor(Qt::WaitCursor));
+    }
+    pointer_ = p;
+}
+
+bool QtInteraction::showHelp(const std::string& file, int topic) {
+    const HelpFileCheck check = checkHelpFile(QString::fromStdString(file), manualFolders_);
+    if (!check.ok()) {
+        message(check.error.toStdString());
+        return false;
+    }
+    if (!helpViewer_) helpViewer_ = std::make_unique<HelpViewer>(nullptr);
+    helpViewer_->showTopic(check.path, topic);
+    helpViewer_->show();
+    helpViewer_->raise();
+    helpViewer_->activateWindow();
+    return true;
+}
+
+}  // namespace zp::ui

@@ -1,0 +1,68 @@
+#include "ui/single_instance.h"
+
+#include <QDir>
+#include <QLocalServer>
+#include <QLocalSocket>
+#include <QRegularExpression>
+
+namespace zp::ui {
+
+SingleInstance::SingleInstance(QString key, QObject* parent)
+    : QObject(parent), key_(std::move(key)) {}
+
+SingleInstance::~SingleInstance() = default;
+
+QString SingleInstance::defaultKey() {
+    const QString override = qEnvironmentVariable("ZP_INSTANCE_KEY");
+    if (!override.isEmpty()) return override;
+    QString user = qEnvironmentVariable("USER");
+    if (user.isEmpty()) user = qEnvironmentVariable("USERNAME");
+    if (user.isEmpty()) user = QDir::home().dirName();
+    // The key becomes a file name: keep it to harmless characters.
+    user.replace(QRegularExpression(QStringLiteral("[^A-Za-z0-9_.-]")), QStringLiteral("_"));
+    return QStringLiteral("zentra-pulse-") + user;
+}
+
+SingleInstance::Role SingleInstance::start() {
+    {
+        QLocalSocket probe;
+        probe.connectToServer(key_);
+        if (probe.waitForConnected(1000)) {
+            probe.write(kRaiseMessage);
+            probe.waitForBytesWritten(1000);
+            probe.disconnectFromServer();
+            if (probe.state() != QLocalSocket::UnconnectedState) probe.waitForDisconnected(1000);
+            return Role::Secondary;
+        }
+    }
+    // Nobody answered: a socket left by a crashed run is stale and goes.
+    QLocalServer::removeServer(key_);
+    server_ = new QLocalServer(this);
+    server_->setSocketOptions(QLocalServer::UserAccessOption);
+    if (!server_->listen(key_)) {
+        qWarning("zentra-pulse: cannot listen for a second start: %s",
+                 qPrintable(server_->errorString()));
+        return Role::Primary;
+    }
+    connect(server_, &QLocalServer::newConnection, this, &SingleInstance::onNewConnection);
+    return Role::Primary;
+}
+
+void SingleInstance::onNewConnection() {
+    while (QLocalSocket* socket = server_->nextPendingConnection()) {
+        // Only the one known message counts; anything else is dropped unread.
+        auto drain = [this, socket] {
+            while (socket->canReadLine()) {
+                if (socket->readLine(64) == kRaiseMessage) emit raiseRequested();
+            }
+            if (socket->bytesAvailable() > 64) socket->abort();
+        };
+        connect(socket, &QLocalSocket::readyRead, this, drain);
+        connect(socket, &QLocalSocket::disconnected, this, [socket, drain] {
+            drain();
+            socket->deleteLater();
+        });
+    }
+}
+
+}  // namespace zp::ui
