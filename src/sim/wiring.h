@@ -1,0 +1,42 @@
+#pragma once
+// How the external generator outputs reach the analyzer: row 0 drives the source modulation, the
+// other rows the receiver IF gates (two-port A, B, R1, R2; four-port A, B, C, D, R).
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace zp::sim {
+
+struct WiredOutput {
+    int address = 0;  // GPIB address of the generator
+    int output = 1;   // its output, 1 or 2
+};
+
+class Wiring {
+  public:
+    // Row r is driven by the generator at 11 + r/2, output 1 + r%2.
+    static Wiring defaultTable(int ports);
+
+    Wiring(int ports, std::vector<WiredOutput> rows);
+
+    int ports() const { return ports_; }
+    int rowCount() const { return static_cast<int>(rows_.size()); }
+    // Throws std::out_of_range for a row that is not wired.
+    const WiredOutput& row(int r) const;
+    void setRow(int r, WiredOutput output);
+
+    // The gate row of a receiver ("A", "R1", "R" ...), -1 when the layout has no such receiver.
+    static int gateRow(std::string_view receiver, int ports);
+    // The path element that routes an internal generator to a receiver's gate.
+    static std::string gateElement(std::string_view receiver) {
+        return "IFGate" + std::string(receiver);
+    }
+    static constexpr const char* kSourceElement = "PulseModDrive";
+
+  private:
+    int ports_;
+    std::vector<WiredOutput> rows_;
+};
+
+}  // namespace zp::sim
