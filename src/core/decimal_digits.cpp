@@ -84,8 +84,8 @@ std::string DecimalDigits::exponentText() const {
         out += digits.substr(1);
     }
     out += exponent < 0 ? "E-" : "E+";
-    std::string e = std::to_string(std::abs(exponent));
-    if (e.size() < 2) e.insert(0, "0");
+    const std::string e = std::to_string(std::abs(exponent));
+    if (e.size() < 2) out += '0';
     return out + e;
 }
 

@@ -32,13 +32,25 @@ bool equalsIgnoreCase(std::string_view a, std::string_view b) {
 
 // Both micro signs become 'u' so that "µs" and "μsec" read as "us".
 std::string asciiMicro(std::string_view s) {
-    std::string out(s);
-    for (const std::string_view micro : {"\xC2\xB5", "\xCE\xBC"}) {
-        for (auto pos = out.find(micro); pos != std::string::npos; pos = out.find(micro)) {
-            out.replace(pos, micro.size(), "u");
+    std::string out;
+    for (std::size_t i = 0; i < s.size(); ++i) {
+        const auto pair = s.substr(i, 2);
+        if (pair == "\xC2\xB5" || pair == "\xCE\xBC") {
+            out.push_back('u');
+            ++i;
+        } else {
+            out.push_back(s[i]);
         }
     }
     return out;
+}
+
+std::string quoted(std::string_view t) {
+    std::string s;
+    s.push_back('\'');
+    s.append(t);
+    s.push_back('\'');
+    return s;
 }
 
 // The length of the leading number: sign, digits with one point, and an exponent only when
@@ -214,7 +226,7 @@ EntryField::Parsed EntryField::parse(std::string_view text) const {
     const std::string_view t = trim(text);
     const std::size_t numberLength = numberPrefixLength(t);
     const auto number = parseNumber(t.substr(0, numberLength));
-    if (!number) return {std::nullopt, "'" + std::string(t) + "' is not a number"};
+    if (!number) return {std::nullopt, quoted(t) + " is not a number"};
 
     const std::string rest = asciiMicro(trim(t.substr(numberLength)));
     const auto accept = [&](double multiplier) -> Parsed {
@@ -222,7 +234,7 @@ EntryField::Parsed EntryField::parse(std::string_view text) const {
         if (const auto k = powerOfTen(multiplier))
             exact = scaledDecimal(t.substr(0, numberLength), *k);
         const double v = exact ? *exact : *number * multiplier;
-        if (!std::isfinite(v)) return {std::nullopt, "'" + std::string(t) + "' is too large"};
+        if (!std::isfinite(v)) return {std::nullopt, quoted(t) + " is too large"};
         return {v, {}};
     };
     if (rest.empty()) return accept(1.0);
@@ -257,7 +269,7 @@ EntryField::Parsed EntryField::parse(std::string_view text) const {
             hint += (i ? ", " : "") + units_[i].name;
         }
     }
-    return {std::nullopt, "unknown unit '" + rest + "' (" + hint + ")"};
+    return {std::nullopt, "unknown unit " + quoted(rest) + " (" + hint + ")"};
 }
 
 std::string EntryField::textWithUnit(double v) const {

@@ -40,7 +40,7 @@ double roundHalfEven(double v, int decimals) {
         const bool lastOdd = !kept.empty() && ((kept.back() - '0') % 2 == 1);
         up = !exactTie || lastOdd;
     }
-    if (kept.empty()) kept = "0";
+    if (kept.empty()) kept.push_back('0');
     if (up) incrementDecimal(kept);
     // The kept digits are a whole number of units of 10^-decimals.
     std::string text = (d.negative ? "-" : "") + kept + "e" + std::to_string(-decimals);
@@ -107,9 +107,10 @@ std::string exportText(double v) {
     const auto res = std::to_chars(buf, buf + sizeof buf, v, std::chars_format::scientific, 6);
     std::string text(buf, res.ptr);
     const auto e = text.find('e');
-    std::string expDigits = text.substr(e + 2);
-    while (expDigits.size() < 3) expDigits.insert(0, "0");
-    return text.substr(0, e + 2) + expDigits;
+    const std::string expDigits = text.substr(e + 2);
+    std::string out = text.substr(0, e + 2);
+    if (expDigits.size() < 3) out.append(3 - expDigits.size(), '0');
+    return out + expDigits;
 }
 
 std::optional<double> parseNumber(std::string_view text) {
