@@ -51,46 +51,53 @@ void JsonWriter::beforeValue() {
         afterKey_ = false;
         return;
     }
-    if (hasMembers_.empty()) {
+    if (open_.empty()) {
         if (!out_.empty()) throw std::logic_error("JSON text already has its one value");
         return;
     }
-    if (hasMembers_.back())
-        out_ += hasMembers_.size() == 1 ? ",\n " : ", ";
-    else if (hasMembers_.size() == 1)
-        out_ += "\n ";
-    hasMembers_.back() = true;
+    if (open_.back().closing == '}') throw std::logic_error("JSON object member without a name");
+    separate();
 }
 
-void JsonWriter::open(char bracket) {
+void JsonWriter::separate() {
+    if (open_.back().hasMembers)
+        out_ += open_.size() == 1 ? ",\n " : ", ";
+    else if (open_.size() == 1)
+        out_ += "\n ";
+    open_.back().hasMembers = true;
+}
+
+void JsonWriter::open(char bracket, char closing) {
     beforeValue();
     out_ += bracket;
-    hasMembers_.push_back(false);
+    open_.push_back({closing, false});
 }
 
-void JsonWriter::close(char bracket) {
-    if (hasMembers_.empty() || afterKey_) throw std::logic_error("unbalanced JSON text");
-    if (hasMembers_.size() == 1 && hasMembers_.back()) out_ += '\n';
-    hasMembers_.pop_back();
-    out_ += bracket;
+void JsonWriter::close(char closing) {
+    if (open_.empty() || afterKey_ || open_.back().closing != closing)
+        throw std::logic_error("unbalanced JSON text");
+    if (open_.size() == 1 && open_.back().hasMembers) out_ += '\n';
+    open_.pop_back();
+    out_ += closing;
 }
 
 void JsonWriter::beginObject() {
-    open('{');
+    open('{', '}');
 }
 void JsonWriter::endObject() {
     close('}');
 }
 void JsonWriter::beginArray() {
-    open('[');
+    open('[', ']');
 }
 void JsonWriter::endArray() {
     close(']');
 }
 
 void JsonWriter::key(std::string_view name) {
-    if (hasMembers_.empty() || afterKey_) throw std::logic_error("JSON member name out of place");
-    beforeValue();
+    if (open_.empty() || afterKey_ || open_.back().closing != '}')
+        throw std::logic_error("JSON member name out of place");
+    separate();
     out_ += jsonQuoted(name);
     out_ += ": ";
     afterKey_ = true;

@@ -30,11 +30,16 @@ class JsonWriter {
 
   private:
     void beforeValue();
-    void open(char bracket);
-    void close(char bracket);
+    void separate();
+    void open(char bracket, char closing);
+    void close(char closing);
 
     std::string out_;
-    std::vector<bool> hasMembers_;  // one entry per open object or array
+    struct Open {
+        char closing;  // '}' or ']'
+        bool hasMembers;
+    };
+    std::vector<Open> open_;
     bool afterKey_ = false;
 };
 

@@ -1,0 +1,245 @@
+// Timing rules, the duty-cycle text and Calculate on both solver paths.
+
+#include <cmath>
+
+#include "form_fixture.h"
+
+namespace zp::test {
+namespace {
+
+constexpr const char* kWidthLimit =
+    "The pulse width must be less than 90% of the pulse period (1/PRF)";
+constexpr const char* kNoSolution =
+    "No solution found.\nFor more information, see \"Pulsed Application\" in Veltrix Zentra "
+    "online help.";
+
+using Calculate = FormTest;
+
+void typePrf(MainForm& form, double prf) {
+    ASSERT_EQ(form.VexoEdit_prf.enter(prf), std::nullopt);
+}
+
+// ---- The 90 % width limit.
+
+TEST_F(Calculate, WidthLimitIsStrict) {
+    typePrf(form, 100000);
+    form.VexoEdit_width[0].setValue(8e-6);
+    EXPECT_TRUE(form.FPulseWidthOK(100000));
+    form.VexoEdit_width[0].setValue(9e-6);
+    EXPECT_FALSE(form.FPulseWidthOK(100000));
+    EXPECT_EQ(ui.messages, std::vector<std::string>{kWidthLimit});
+}
+
+TEST_F(Calculate, DisabledGateDoesNotCountButRowZeroAlwaysDoes) {
+    typePrf(form, 100000);
+    form.VexoEdit_width[2].setValue(20e-6);
+    form.VexoEdit_width[2].setEnabled(false);
+    EXPECT_TRUE(form.FPulseWidthOK(100000));
+    form.VexoEdit_width[0].setValue(9.5e-6);
+    form.VexoEdit_width[0].setEnabled(false);
+    EXPECT_FALSE(form.FPulseWidthOK(100000));
+}
+
+TEST_F(Calculate, FailedWidthTestSolvesNothing) {
+    typePrf(form, 100000);
+    form.VexoEdit_width[1].setValue(9e-6);
+    form.b_calculate_Click();
+    EXPECT_EQ(solver.created, 0);
+    EXPECT_EQ(ui.messages, std::vector<std::string>{kWidthLimit});
+    EXPECT_EQ(state.PRF, 0.0);
+    EXPECT_FALSE(form.b_apply.enabled);
+    EXPECT_EQ(ui.pointers, (std::vector<Pointer>{Pointer::Busy, Pointer::Normal}));
+}
+
+// ---- Width and delay scans.
+
+TEST_F(Calculate, ScansLookAtEnabledRowsAfterTheFirst) {
+    form.VexoEdit_width[0].setValue(7e-6);
+    form.VexoEdit_width[0].setEnabled(false);
+    form.VexoEdit_width[1].setValue(0.5e-6);
+    form.VexoEdit_width[3].setValue(3e-6);
+    form.VexoEdit_width[4].setValue(0.1e-6);
+    form.VexoEdit_width[4].setEnabled(false);
+    EXPECT_EQ(form.FMaxPulseWidth(), 7e-6);
+    EXPECT_EQ(form.FMaxGateWidth(), 3e-6);
+    EXPECT_EQ(form.FMinPulseWidth(), 0.5e-6);
+
+    form.VexoEdit_delay[0].setValue(9e-6);
+    form.VexoEdit_delay[1].setValue(1e-6);
+    form.VexoEdit_delay[1].setEnabled(false);  // the first row of the scan counts anyway
+    EXPECT_EQ(form.FHighestGateDelay(), 1e-6);
+    form.VexoEdit_delay[3].setValue(2e-6);
+    EXPECT_EQ(form.FHighestGateDelay(), 2e-6);
+}
+
+TEST_F(Calculate, AutoGainAtThe50kHzBoundary) {
+    form.VexoEdit_width[0].setValue(500e-9);
+    state.PRF = 50000;
+    EXPECT_EQ(form.FAutoGain(), 1);
+    state.PRF = 50001;
+    EXPECT_EQ(form.FAutoGain(), 0);
+    form.VexoEdit_width[2].setValue(50e-9);
+    EXPECT_EQ(form.FAutoGain(), 1);
+}
+
+// ---- Solving.
+
+TEST_F(Calculate, SecondPressWithoutChangeDoesNotSolveAgain) {
+    form.b_calculate_Click();
+    form.b_calculate_Click();
+    EXPECT_EQ(solver.created, 1);
+    EXPECT_EQ(solver.calls, std::vector<std::string>{"SolveExternal"});
+    EXPECT_TRUE(ui.messages.empty());
+    EXPECT_FALSE(isTrue(state.NeedsCalculation));
+    EXPECT_TRUE(form.b_apply.enabled);
+    EXPECT_EQ(state.PRF, 5000);
+}
+
+TEST_F(Calculate, NoSolutionKeepsEntriesAndApplyDisabled) {
+    typePrf(form, 12345);
+    solver.prf = 0.0;
+    form.b_calculate_Click();
+    EXPECT_EQ(ui.messages, std::vector<std::string>{kNoSolution});
+    EXPECT_EQ(form.VexoEdit_prf.value(), 12340);
+    EXPECT_TRUE(isTrue(state.NeedsCalculation));
+    EXPECT_FALSE(form.b_apply.enabled);
+    EXPECT_EQ(state.PRF, 0.0);
+    EXPECT_EQ(form.lbl_DutyCycle.caption, "");
+}
+
+TEST_F(Calculate, ResultsGoIntoTheFieldsWithoutRunningRules) {
+    solver.prf = 6000.5;  // would be cut to 6000 by the PRF rule
+    solver.ifbw = 3001;
+    form.b_calculate_Click();
+    EXPECT_EQ(form.VexoEdit_prf.value(), 6000.5);
+    EXPECT_EQ(form.VexoEdit_IFBW.value(), 3001);
+    EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 1 / 6000.5);  // the moved PRF's interval
+    EXPECT_FALSE(isTrue(state.NeedsCalculation));
+    EXPECT_TRUE(form.b_apply.enabled);
+    EXPECT_EQ(state.SolvedIFCount, 7);
+}
+
+TEST_F(Calculate, UnmovedPrfLeavesTheIntervalAlone) {
+    form.VexoEdit_pri.setValue(123e-6);
+    form.b_calculate_Click();
+    EXPECT_EQ(form.VexoEdit_pri.value(), 123e-6);
+}
+
+TEST_F(Calculate, ExternalDecadeFromTheDesiredPrf) {
+    const std::pair<double, int> cases[] = {{999, -1}, {1000, -1}, {5000, 0}, {10000, 1},
+                                            {1e6, 2},  {500, -1},  {0.5, -4}};
+    for (auto& width : form.VexoEdit_width) width.setValue(100e-9);  // fits 1 MHz
+    for (const auto& [prf, decade] : cases) {
+        typePrf(form, prf);
+        form.b_calculate_Click();
+        EXPECT_EQ(solver.decade, decade) << prf;
+        EXPECT_EQ(solver.desiredPrf, prf);
+    }
+    EXPECT_EQ(solver.flag, kTrue);
+    EXPECT_EQ(solver.fixedPrf, kTrue);
+}
+
+TEST_F(Calculate, ExternalPathPassesRoundedIfbwAndConverterDelay) {
+    ASSERT_EQ(form.VexoEdit_IFBW.enter(2500.5), std::nullopt);
+    form.b_calculate_Click();
+    EXPECT_EQ(solver.ifbwHzIn, 2500);  // ties to even
+    EXPECT_EQ(solver.converterDelay, 0.0);
+
+    form.m_ConverterMeas_Click();
+    form.setFixedPRF(false);
+    form.b_calculate_Click();
+    EXPECT_EQ(solver.converterDelay, 6.2e-6);
+    EXPECT_EQ(state.ConverterDelay, 6.2e-6);
+    EXPECT_EQ(solver.fixedPrf, kFalse);
+}
+
+TEST_F(Calculate, InternalGatedGetsGateRowsOnly) {
+    load(twoPortInternal());
+    form.VexoEdit_width[0].setValue(8e-6);
+    form.VexoEdit_width[1].setValue(1e-6);
+    form.VexoEdit_width[3].setValue(3e-6);
+    form.VexoEdit_width[4].setValue(5e-6);
+    form.VexoEdit_width[4].setEnabled(false);
+    form.VexoEdit_delay[0].setValue(9e-6);
+    form.VexoEdit_delay[2].setValue(2e-6);
+    form.VexoEdit_delay[4].setValue(4e-6);
+    form.VexoEdit_delay[4].setEnabled(false);
+    solver.ifbw = 2500.5;
+    form.b_calculate_Click();
+    ASSERT_EQ(solver.calls, std::vector<std::string>{"SolveInternalGated"});
+    EXPECT_EQ(solver.highestGateDelay, 2e-6);
+    EXPECT_EQ(solver.widestGateWidth, 3e-6);
+    EXPECT_EQ(solver.pulseClockHz, 100e6);
+    EXPECT_EQ(solver.ifbwIn, 500);
+    EXPECT_EQ(state.IFBWHz, 2500);
+    EXPECT_EQ(form.VexoEdit_IFBW.value(), 2500);
+    EXPECT_EQ(state.GatedSolveTicks, 42);
+}
+
+TEST_F(Calculate, InternalWithoutSwGatingUsesThePlainSolveAndSlowClock) {
+    FakeAnalyzerSetup setup = twoPortInternal();
+    setup.hardwareValue = "3";
+    load(setup);
+    form.m_NoSWGating_Click();
+    form.b_calculate_Click();
+    EXPECT_EQ(solver.calls, std::vector<std::string>{"SolveInternal"});
+    EXPECT_EQ(solver.pulseClockHz, 60e6);
+    EXPECT_EQ(state.IntSolveList1, (std::vector<std::int32_t>{1, 2, 3}));
+}
+
+TEST_F(Calculate, ThrowingSolverIsReportedAndChangesNothing) {
+    form.b_calculate_Click();  // a first solution to fall back on
+    ASSERT_EQ(form.VexoEdit_width[1].enter(2e-6), std::nullopt);
+    const double lastPrf = state.PRF;
+    state.SolvedIFCount = 3;
+    solver.prf = 1234.0;
+    solver.error = "solver exploded";
+    ui.pointers.clear();
+    form.b_calculate_Click();
+    EXPECT_EQ(ui.messages, std::vector<std::string>{"solver exploded"});
+    EXPECT_EQ(state.PRF, lastPrf);
+    EXPECT_EQ(state.SolvedIFCount, 3);
+    EXPECT_EQ(state.SolvedFreqOffset, 123.0);  // from the first solve, not the failed one
+    EXPECT_TRUE(isTrue(state.NeedsCalculation));
+    EXPECT_FALSE(form.b_apply.enabled);
+    EXPECT_EQ(form.VexoEdit_prf.value(), 5000);
+    EXPECT_EQ(ui.pointers, (std::vector<Pointer>{Pointer::Busy, Pointer::Normal}));
+}
+
+TEST_F(Calculate, NonFinitePrfFromTheSolverIsAnError) {
+    solver.prf = std::nan("");
+    form.b_calculate_Click();
+    ASSERT_EQ(ui.messages.size(), 1u);
+    EXPECT_NE(ui.messages[0].find("invalid PRF"), std::string::npos);
+    EXPECT_EQ(state.PRF, 0.0);
+    EXPECT_TRUE(isTrue(state.NeedsCalculation));
+}
+
+TEST(CalculateWithoutSolver, MissingSolverIsReported) {
+    PulsedModule state;
+    FakeBench bench;
+    ScriptedInteraction ui;
+    MainForm form(state, bench, ui, [] { return std::unique_ptr<TimingSolver>(); });
+    form.Form_Load();
+    form.b_calculate_Click();
+    EXPECT_EQ(ui.messages, std::vector<std::string>{"The timing solver is not available."});
+    EXPECT_TRUE(isTrue(state.NeedsCalculation));
+}
+
+// ---- Duty cycle.
+
+TEST_F(Calculate, DutyCycleListsEnabledRows) {
+    typePrf(form, 100000);
+    for (int row : {0, 2, 3, 4}) form.VexoEdit_width[row].setEnabled(false);
+    form.VexoEdit_width[1].setValue(1.25e-6);
+    form.b_calculate_Click();
+    EXPECT_EQ(form.lbl_DutyCycle.caption, "A IF Gate :12.5%\n");
+
+    form.VexoEdit_width[0].setEnabled(true);
+    form.VexoEdit_width[0].setValue(1.234567e-6);
+    form.SUpdateDutyCycle();
+    EXPECT_EQ(form.lbl_DutyCycle.caption, "Source Modulation :12.3457%\nA IF Gate :12.5%\n");
+}
+
+}  // namespace
+}  // namespace zp::test
