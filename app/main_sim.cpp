@@ -1,0 +1,143 @@
+// zentra-pulse-sim: serves simulated pulse generators as raw SCPI sockets, so that the program's
+// socket transport (or any raw SCPI client) can be tried without instruments.
+
+#include <signal.h>
+
+#include <charconv>
+#include <cstdio>
+#include <iostream>
+#include <map>
+#include <memory>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "sim/scpi_server.h"
+#include "sim/sim_generator.h"
+
+namespace {
+
+constexpr const char* kUsage =
+    "Usage: zentra-pulse-sim --serve ADDRESS=PORT [ADDRESS=PORT ...] [--bind ADDR]\n"
+    "\n"
+    "Serves one simulated two-output pulse generator per GPIB ADDRESS (0..30) as a raw SCPI\n"
+    "socket on TCP PORT (0 picks a free port), until SIGINT or SIGTERM.\n"
+    "\n"
+    "  --serve ADDRESS=PORT  generators to serve; entries separated by blanks or commas\n"
+    "  --bind ADDR           address to listen on (default 127.0.0.1)\n"
+    "  --help                show this text\n"
+    "\n"
+    "Example: zentra-pulse-sim --serve 11=5025 12=5026\n"
+    "then point the program at them with --bus 11=TCPIP0::127.0.0.1::5025::SOCKET,"
+    "12=TCPIP0::127.0.0.1::5026::SOCKET\n";
+
+struct Options {
+    std::map<int, int> ports;
+    std::string bind = "127.0.0.1";
+    bool help = false;
+};
+
+std::optional<int> number(std::string_view text) {
+    int value = 0;
+    const auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), value);
+    if (text.empty() || ec != std::errc{} || end != text.data() + text.size()) return std::nullopt;
+    return value;
+}
+
+void addServeEntries(std::string_view text, Options& options) {
+    std::size_t pos = 0;
+    while (pos <= text.size()) {
+        const std::size_t comma = text.find(',', pos);
+        const std::string_view entry = text.substr(
+            pos, comma == std::string_view::npos ? std::string_view::npos : comma - pos);
+        pos = comma == std::string_view::npos ? text.size() + 1 : comma + 1;
+        if (entry.empty()) continue;
+        const std::size_t eq = entry.find('=');
+        const auto address = number(entry.substr(0, eq));
+        const auto port =
+            eq == std::string_view::npos ? std::nullopt : number(entry.substr(eq + 1));
+        if (!address || *address < 0 || *address > 30 || !port || *port < 0 || *port > 65535) {
+            throw std::invalid_argument("bad --serve entry \"" + std::string(entry) +
+                                        "\" (expected ADDRESS=PORT, ADDRESS 0..30, PORT 0..65535)");
+        }
+        if (!options.ports.emplace(*address, *port).second) {
+            throw std::invalid_argument("GPIB address " + std::to_string(*address) +
+                                        " is served twice");
+        }
+    }
+}
+
+Options parseArguments(const std::vector<std::string>& args) {
+    Options options;
+    bool serving = false;
+    for (std::size_t i = 0; i < args.size(); ++i) {
+        const std::string& a = args[i];
+        if (a == "--help" || a == "-h") {
+            options.help = true;
+        } else if (a == "--serve") {
+            serving = true;
+        } else if (a.rfind("--serve=", 0) == 0) {
+            serving = true;
+            addServeEntries(std::string_view(a).substr(8), options);
+        } else if (a == "--bind") {
+            if (i + 1 >= args.size()) throw std::invalid_argument("--bind needs an address");
+            options.bind = args[++i];
+            serving = false;
+        } else if (a.rfind("--bind=", 0) == 0) {
+            options.bind = a.substr(7);
+            serving = false;
+        } else if (serving && a.rfind("-", 0) != 0) {
+            addServeEntries(a, options);
+        } else {
+            throw std::invalid_argument("unknown argument \"" + a + "\"");
+        }
+    }
+    if (!options.help && options.ports.empty()) {
+        throw std::invalid_argument("nothing to serve: give --serve ADDRESS=PORT");
+    }
+    if (options.bind.empty()) throw std::invalid_argument("--bind needs an address");
+    return options;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    Options options;
+    try {
+        options = parseArguments(std::vector<std::string>(argv + 1, argv + argc));
+    } catch (const std::invalid_argument& e) {
+        std::cerr << "zentra-pulse-sim: " << e.what() << "\n" << kUsage;
+        return 2;
+    }
+    if (options.help) {
+        std::cout << kUsage;
+        return 0;
+    }
+
+    // Block the stop signals before the server thread starts so that only sigwait sees them.
+    sigset_t stopSignals;
+    sigemptyset(&stopSignals);
+    sigaddset(&stopSignals, SIGINT);
+    sigaddset(&stopSignals, SIGTERM);
+    pthread_sigmask(SIG_BLOCK, &stopSignals, nullptr);
+    signal(SIGPIPE, SIG_IGN);
+
+    std::map<int, std::unique_ptr<zp::sim::SimGenerator>> generators;
+    for (const auto& [address, port] : options.ports) {
+        generators[address] = std::make_unique<zp::sim::SimGenerator>(address, "");
+    }
+    try {
+        zp::sim::ScpiServer server(options.ports, zp::sim::ScpiServer::forGenerators(generators),
+                                   options.bind);
+        std::cout << "zentra-pulse-sim: serving " << server.describe() << std::endl;
+        int received = 0;
+        sigwait(&stopSignals, &received);
+        std::cout << "zentra-pulse-sim: stopped" << std::endl;
+    } catch (const std::exception& e) {
+        std::cerr << "zentra-pulse-sim: " << e.what() << "\n";
+        return 1;
+    }
+    return 0;
+}

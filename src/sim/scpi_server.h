@@ -1,0 +1,55 @@
+#pragma once
+// Serves instruments as raw SCPI sockets, one TCP port per GPIB address, on one background
+// thread. Lines are framed on LF (a CR before it is dropped); a line whose handler returns no
+// reply gets none, as on a real instrument. Several clients may be connected at once; a client
+// that sends an over-long line (1 MiB without LF) is disconnected.
+
+#include <functional>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <thread>
+
+#include "sim/sim_generator.h"
+
+namespace zp::sim {
+
+class ScpiServer {
+  public:
+    // Called on the server thread, one line at a time, with the server's lock held.
+    using Handler = std::function<std::optional<std::string>(int address, std::string_view line)>;
+
+    // ports: GPIB address -> TCP port (0 picks a free one). Listens before the constructor
+    // returns; throws std::runtime_error naming the address and port when it cannot.
+    ScpiServer(const std::map<int, int>& ports, Handler handler,
+               const std::string& bindAddress = "127.0.0.1");
+    ~ScpiServer();  // stops and joins
+    ScpiServer(const ScpiServer&) = delete;
+    ScpiServer& operator=(const ScpiServer&) = delete;
+
+    // A handler that passes each line to the generator at that address (which must outlive it).
+    static Handler forGenerators(std::map<int, std::unique_ptr<SimGenerator>>& generators);
+
+    int port(int address) const;  // -1 when not served
+    const std::string& bindAddress() const { return bindAddress_; }
+    // "11 on 127.0.0.1:5025, 12 on 127.0.0.1:5026"
+    std::string describe() const;
+
+    // Runs f with the server's lock held, e.g. to look at generator state between requests.
+    void withLock(const std::function<void()>& f);
+
+    void stop();
+
+  private:
+    class Loop;
+    std::string bindAddress_;
+    std::map<int, int> ports_;
+    std::mutex mutex_;
+    std::unique_ptr<Loop> loop_;
+    std::thread thread_;
+};
+
+}  // namespace zp::sim
