@@ -83,6 +83,7 @@ TEST_F(Startup, RowsStepEvenlyDownTheGateFrame) {
 }
 
 TEST_F(Startup, UnlistedModelHasNoSwGatingDisabledAndNoPulseConfiguration) {
+    bench.log = {};
     load(unlisted());
     EXPECT_EQ(form.rowCount(), 5);
     EXPECT_EQ(form.lbl_gate[1].caption, "A IF Gate :");
