@@ -180,6 +180,7 @@ class ScpiServer::Loop {
         while (true) {
             const std::size_t lf = c.in.find('\n', std::max(start, c.scanned));
             if (lf == std::string::npos) break;
+            if (lf - start > kMaxLine) return false;
             std::string_view line(c.in.data() + start, lf - start);
             if (!line.empty() && line.back() == '\r') line.remove_suffix(1);
             std::optional<std::string> reply;

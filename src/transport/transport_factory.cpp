@@ -66,12 +66,19 @@ std::string trimmed(std::string_view text) {
     return std::string(text);
 }
 
+// Stray commas around an entry ("11=..., ,") are separators, not part of it.
+std::string withoutCommas(std::string_view text) {
+    while (!text.empty() && text.front() == ',') text.remove_prefix(1);
+    while (!text.empty() && text.back() == ',') text.remove_suffix(1);
+    return std::string(text);
+}
+
 }  // namespace
 
 BusResources parseBusResources(std::string_view text) {
     BusResources resources;
     for (const std::string& entry : splitEntries(text)) {
-        const std::string e = trimmed(entry);
+        const std::string e = withoutCommas(trimmed(entry));
         if (e.empty()) continue;
         const std::size_t eq = e.find('=');
         if (eq == std::string::npos) {

@@ -1,0 +1,76 @@
+#include <gtest/gtest.h>
+
+#include <stdexcept>
+
+#include "transport/resource.h"
+#include "transport/transport_factory.h"
+
+namespace zp {
+namespace {
+
+using transport::GpibResource;
+using transport::parseResource;
+using transport::SocketResource;
+using transport::Vxi11Resource;
+
+TEST(ParseBusResources, CommasBlanksAndVxiCommas) {
+    const auto r = parseBusResources(
+        "11=TCPIP0::192.0.2.10::5025::SOCKET,12=GPIB0::12::INSTR "
+        "13=TCPIP0::gw.lab::gpib0,13::INSTR, 14 = TCPIP::10.0.0.2::INSTR");
+    const BusResources expected = {{11, "TCPIP0::192.0.2.10::5025::SOCKET"},
+                                   {12, "GPIB0::12::INSTR"},
+                                   {13, "TCPIP0::gw.lab::gpib0,13::INSTR"},
+                                   {14, "TCPIP::10.0.0.2::INSTR"}};
+    EXPECT_EQ(r, expected);
+}
+
+TEST(ParseBusResources, BadInputNamesTheProblem) {
+    const struct {
+        const char* text;
+        const char* mentions;
+    } cases[] = {
+        {"", "No bus resources"},
+        {"  , ", "No bus resources"},
+        {"11", "ADDRESS=RESOURCE"},
+        {"=GPIB0::1::INSTR", "0 to 30"},
+        {"31=GPIB0::1::INSTR", "0 to 30"},
+        {"x=GPIB0::1::INSTR", "0 to 30"},
+        {"11=", "names no resource"},
+        {"11=GPIB0::1::INSTR,11=GPIB0::2::INSTR", "more than once"},
+        {"11=TCPIP0::host::99999::SOCKET", "port"},
+        {"11=TCPIP0::host::SOCKET", "host and port"},
+        {"11=TCPIP0::ho st::5025::SOCKET", "Bad resource"},
+        {"11=USB0::1::2::INSTR", "unknown interface"},
+        {"11=GPIB0::31::INSTR", "0..30"},
+        {"11=GPIB0::5::SOCKET", "INSTR"},
+    };
+    for (const auto& c : cases) {
+        try {
+            parseBusResources(c.text);
+            ADD_FAILURE() << "accepted: " << c.text;
+        } catch (const std::invalid_argument& e) {
+            EXPECT_NE(std::string(e.what()).find(c.mentions), std::string::npos)
+                << c.text << " -> " << e.what();
+        }
+    }
+}
+
+TEST(ParseResource, Kinds) {
+    const auto socket = std::get<SocketResource>(parseResource("tcpip0::127.0.0.1::5025::socket"));
+    EXPECT_EQ(socket.host, "127.0.0.1");
+    EXPECT_EQ(socket.port, 5025);
+
+    const auto vxi = std::get<Vxi11Resource>(parseResource("TCPIP0::gateway::gpib0,7::INSTR"));
+    EXPECT_EQ(vxi.host, "gateway");
+    EXPECT_EQ(vxi.device, "gpib0,7");
+    EXPECT_EQ(std::get<Vxi11Resource>(parseResource("TCPIP::scope::INSTR")).device, "inst0");
+
+    const auto gpib = std::get<GpibResource>(parseResource("GPIB1::22::3::INSTR"));
+    EXPECT_EQ(gpib.board, 1);
+    EXPECT_EQ(gpib.primary, 22);
+    EXPECT_EQ(gpib.secondary, 3);
+    EXPECT_EQ(std::get<GpibResource>(parseResource("GPIB::4::INSTR")).secondary, -1);
+}
+
+}  // namespace
+}  // namespace zp

@@ -1,0 +1,152 @@
+#include "transport/gpib_library.h"
+
+#include <dlfcn.h>
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+
+#include "instruments/instrument_error.h"
+#include "instruments/io_trace.h"
+#include "transport/transport_factory.h"
+
+namespace zp::transport {
+namespace {
+
+constexpr std::uint16_t kErr = InstrumentBus::kStatusError;
+constexpr std::uint16_t kTimo = InstrumentBus::kStatusTimeout;
+
+// The fake driver's test hooks, looked up in the already loaded library.
+template <typename Fn>
+Fn hook(const char* name) {
+    void* handle = ::dlopen(ZP_FAKE_GPIB_LIBRARY, RTLD_NOW | RTLD_NOLOAD);
+    EXPECT_NE(handle, nullptr);
+    auto fn = reinterpret_cast<Fn>(::dlsym(handle, name));
+    ::dlclose(handle);
+    return fn;
+}
+
+TEST(GpibLibrary, MissingLibrariesAreNamedInTheError) {
+    try {
+        GpibLibrary::load({"/nonexistent/libgpib.so.0", "libni4882-missing.so"});
+        FAIL();
+    } catch (const InstrumentError& e) {
+        EXPECT_NE(e.description().find("/nonexistent/libgpib.so.0"), std::string::npos);
+        EXPECT_NE(e.description().find("libni4882-missing.so"), std::string::npos);
+        EXPECT_NE(e.description().find("ZP_GPIB_LIBRARY"), std::string::npos);
+    }
+}
+
+TEST(GpibLibrary, LibraryWithoutTheDriverFunctionsIsRefused) {
+    try {
+        GpibLibrary::load({ZP_FAKE_GPIB_INCOMPLETE});
+        FAIL();
+    } catch (const InstrumentError& e) {
+        EXPECT_NE(e.description().find("has no function"), std::string::npos) << e.description();
+    }
+}
+
+TEST(GpibLibrary, FallsThroughToTheFirstUsableCandidate) {
+    const auto library = GpibLibrary::load({"/nonexistent/libgpib.so.0", ZP_FAKE_GPIB_LIBRARY});
+    EXPECT_EQ(library->path(), ZP_FAKE_GPIB_LIBRARY);
+}
+
+TEST(GpibLibrary, EnvironmentOverridesTheCandidates) {
+    ::setenv("ZP_GPIB_LIBRARY", "/tmp/custom-gpib.so", 1);
+    EXPECT_EQ(GpibLibrary::candidates(), std::vector<std::string>{"/tmp/custom-gpib.so"});
+    ::unsetenv("ZP_GPIB_LIBRARY");
+    EXPECT_EQ(GpibLibrary::candidates(),
+              (std::vector<std::string>{"libgpib.so.0", "libni4882.so"}));
+}
+
+class GpibBusTest : public ::testing::Test {
+  protected:
+    void SetUp() override { ::setenv("ZP_GPIB_LIBRARY", ZP_FAKE_GPIB_LIBRARY, 1); }
+    void TearDown() override { ::unsetenv("ZP_GPIB_LIBRARY"); }
+    IoTrace trace;
+};
+
+TEST_F(GpibBusTest, QueryThroughTheDriverWithBufferLimit) {
+    auto bus = makeTransportBus({{12, "GPIB0::5::INSTR"}}, &trace);
+    const auto d = bus->openDevice(0, 12, 0, 13, 1, 0);
+    EXPECT_EQ(hook<int (*)()>("fake_gpib_last_timeout_code")(), 13);
+    bus->writeText(d, "*IDN?\n");
+    EXPECT_EQ(bus->status(), 0);
+    EXPECT_STREQ(hook<const char* (*)()>("fake_gpib_last_write")(), "*IDN?\n");
+    std::string buffer(4, ' ');
+    bus->readText(d, buffer);
+    EXPECT_EQ(buffer, "FAKE");
+    buffer.assign(100, ' ');
+    bus->readText(d, buffer);
+    EXPECT_EQ(buffer, ",GPIB,5,1\n");
+    EXPECT_EQ(trace.lines().front(), "BUS 12 open");
+    EXPECT_EQ(trace.lines().back(), "BUS 12 R \",GPIB,5,1\\n\"");
+}
+
+TEST_F(GpibBusTest, DriverTimeoutAndNoListenerMapOntoTheStatusWord) {
+    auto bus = makeTransportBus({{11, "GPIB0::11::INSTR"}, {29, "GPIB0::29::INSTR"}}, &trace);
+    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
+    bus->writeText(d, "SILENT?\n");
+    std::string buffer(100, ' ');
+    bus->readText(d, buffer);
+    EXPECT_EQ(bus->status(), kErr | kTimo);
+    EXPECT_EQ(buffer, std::string(100, ' '));
+    EXPECT_EQ(trace.lines().back(), "BUS 11 timeout");
+
+    const auto nobody = bus->openDevice(0, 29, 0, 13, 1, 0);
+    bus->writeText(nobody, "*IDN?\n");
+    EXPECT_EQ(bus->status(), kErr);
+    EXPECT_EQ(trace.lines().back(), "BUS 29 error ibwrt: no listener");
+}
+
+TEST_F(GpibBusTest, ClearDropsThePendingReplyAndDevicesGoOfflineWithTheBus) {
+    auto bus = makeTransportBus({{7, "GPIB0::7::INSTR"}}, nullptr);
+    const auto d = bus->openDevice(0, 7, 0, 13, 1, 0);
+    bus->writeText(d, "ECHO? hello\n");
+    bus->clearDevice(d);
+    EXPECT_EQ(bus->status(), 0);
+    std::string buffer(100, ' ');
+    bus->readText(d, buffer);
+    EXPECT_EQ(bus->status(), kErr | kTimo);
+    const auto isOnline = hook<int (*)(int)>("fake_gpib_is_online");
+    EXPECT_EQ(isOnline(107), 1);
+    bus.reset();
+    EXPECT_EQ(isOnline(107), 0);
+}
+
+TEST_F(GpibBusTest, BoardMissingIsAnInstrumentError) {
+    auto bus = makeTransportBus({{7, "GPIB3::7::INSTR"}}, nullptr);
+    try {
+        bus->openDevice(0, 7, 0, 13, 1, 0);
+        FAIL();
+    } catch (const InstrumentError& e) {
+        EXPECT_NE(e.description().find("GPIB3"), std::string::npos) << e.description();
+        EXPECT_NE(e.description().find("no GPIB board"), std::string::npos) << e.description();
+    }
+}
+
+TEST(GpibBusMissingDriver, OpenFailsWithTheLibraryNames) {
+    ::setenv("ZP_GPIB_LIBRARY", "/nonexistent/libgpib-test.so", 1);
+    auto bus = makeTransportBus({{7, "GPIB0::7::INSTR"}}, nullptr);
+    try {
+        bus->openDevice(0, 7, 0, 13, 1, 0);
+        FAIL();
+    } catch (const InstrumentError& e) {
+        EXPECT_NE(e.description().find("/nonexistent/libgpib-test.so"), std::string::npos);
+    }
+    ::unsetenv("ZP_GPIB_LIBRARY");
+}
+
+TEST(Vxi11, UnreachableGatewayFailsClearly) {
+    // Nothing answers RPC on the loopback port mapper here; the link must fail, not hang.
+    auto bus = makeTransportBus({{9, "TCPIP0::127.0.0.1::gpib0,9::INSTR"}}, nullptr);
+    try {
+        bus->openDevice(0, 9, 0, 11, 1, 0);
+        FAIL();
+    } catch (const InstrumentError& e) {
+        EXPECT_NE(e.description().find("gpib0,9 at 127.0.0.1"), std::string::npos)
+            << e.description();
+    }
+}
+
+}  // namespace
+}  // namespace zp::transport

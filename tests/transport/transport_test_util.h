@@ -1,0 +1,50 @@
+#pragma once
+// Helpers shared by the transport tests: a loopback server with scripted answers.
+
+#include <chrono>
+#include <map>
+#include <memory>
+#include <string>
+
+#include "sim/scpi_server.h"
+#include "sim/sim_generator.h"
+
+namespace zp::testing {
+
+// Generators 11 and 12 served on free ports; "BIG?" answers 4 MiB of pattern text and
+// "SILENT?" nothing.
+struct LoopbackBench {
+    static constexpr std::size_t kBigSize = 4u << 20;
+    static std::string bigReply() {
+        std::string text(kBigSize, ' ');
+        for (std::size_t i = 0; i < text.size(); ++i) text[i] = static_cast<char>('A' + i % 26);
+        text.back() = '\n';
+        return text;
+    }
+
+    LoopbackBench() {
+        generators[11] = std::make_unique<sim::SimGenerator>(11, "");
+        generators[12] = std::make_unique<sim::SimGenerator>(12, "");
+        auto forward = sim::ScpiServer::forGenerators(generators);
+        server = std::make_unique<sim::ScpiServer>(
+            std::map<int, int>{{11, 0}, {12, 0}},
+            [forward, big = bigReply()](int address,
+                                        std::string_view line) -> std::optional<std::string> {
+                if (line == "BIG?") return big;
+                if (line == "SILENT?") return std::nullopt;
+                return forward(address, line);
+            });
+    }
+
+    std::string resource(int address) const {
+        return "TCPIP0::127.0.0.1::" + std::to_string(server->port(address)) + "::SOCKET";
+    }
+
+    std::map<int, std::unique_ptr<sim::SimGenerator>> generators;
+    std::unique_ptr<sim::ScpiServer> server;
+};
+
+// A port with nothing listening on it (bound once, then released).
+int unusedPort();
+
+}  // namespace zp::testing
