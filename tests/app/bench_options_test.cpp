@@ -1,0 +1,101 @@
+#include <gtest/gtest.h>
+
+#include "lib/bench_options.h"
+
+namespace zp::app {
+namespace {
+
+ParsedCommandLine cli(std::vector<std::string> args) {
+    return parseCommandLine(args, Program::Cli);
+}
+ParsedCommandLine gui(std::vector<std::string> args) {
+    return parseCommandLine(args, Program::Gui);
+}
+
+TEST(BenchOptions, DefaultsToTheSimulatedKt622WithSimulatedGenerators) {
+    ParsedCommandLine p = cli({"show"});
+    ASSERT_EQ(p.error, "");
+    EXPECT_EQ(p.options.model, "kt622");
+    EXPECT_FALSE(p.options.bus);
+    EXPECT_FALSE(p.options.traceFile);
+    EXPECT_EQ(p.rest, std::vector<std::string>{"show"});
+}
+
+TEST(BenchOptions, ReadsEveryOptionInBothSpellings) {
+    ParsedCommandLine p = cli({"--analyzer=sim:kt655", "--trace-io", "t.log", "--fault", "baddata",
+                               "--fault=timeout:12", "--bus", "11=TCPIP0::127.0.0.1::5025::SOCKET",
+                               "-y", "set", "prf", "10k"});
+    ASSERT_EQ(p.error, "");
+    EXPECT_EQ(p.options.model, "kt655");
+    EXPECT_EQ(p.options.traceFile, "t.log");
+    EXPECT_EQ(p.options.faults, (std::vector<std::string>{"baddata", "timeout:12"}));
+    EXPECT_EQ(p.options.bus, "11=TCPIP0::127.0.0.1::5025::SOCKET");
+    EXPECT_TRUE(p.options.yes);
+    EXPECT_EQ(p.rest, (std::vector<std::string>{"set", "prf", "10k"}));
+    EXPECT_FALSE(cli({"--bus", "sim"}).options.bus);
+}
+
+TEST(BenchOptions, OptionsEndAtTheFirstActionSoActionWordsAreNeverTakenForOptions) {
+    ParsedCommandLine p = cli({"set", "delay", "0", "--fault", "x"});
+    ASSERT_EQ(p.error, "");
+    EXPECT_EQ(p.rest.size(), 5u);
+    // A negative number starts the actions too, and "--" ends the options.
+    EXPECT_EQ(cli({"-5"}).rest, std::vector<std::string>{"-5"});
+    EXPECT_EQ(cli({"--", "--help"}).rest, std::vector<std::string>{"--help"});
+    EXPECT_FALSE(cli({"--", "--help"}).options.help);
+}
+
+TEST(BenchOptions, RefusesBadOptionsWithAReasonThatNamesThem) {
+    struct Case {
+        std::vector<std::string> args;
+        std::string expected;
+    };
+    const Case cases[] = {
+        {{"--frobnicate"}, "unknown option '--frobnicate'"},
+        {{"--analyzer"}, "option --analyzer needs a value"},
+        {{"--analyzer="}, "option --analyzer needs a value"},
+        {{"--analyzer", "sim:kt999"}, "unknown analyzer model 'kt999'"},
+        {{"--analyzer", "TCPIP0::host::INSTR"}, "unsupported analyzer"},
+        {{"--fault", "bogus"}, "bad --fault value"},
+        {{"--bus", "garbage"}, "bad --bus value"},
+        {{"--screenshot", "x.png"}, "unknown option '--screenshot'"},
+    };
+    for (const Case& c : cases) {
+        ParsedCommandLine p = cli(c.args);
+        EXPECT_NE(p.error.find(c.expected), std::string::npos)
+            << c.args.front() << " gave: " << p.error;
+    }
+}
+
+TEST(BenchOptions, TheWindowProgramTakesNoActionsButAScreenshotFile) {
+    EXPECT_NE(gui({"show"}).error.find("unexpected argument 'show'"), std::string::npos);
+    EXPECT_NE(gui({"--yes"}).error.find("unknown option"), std::string::npos);
+    ParsedCommandLine p = gui({"--screenshot", "w.png", "--analyzer", "sim:kt644"});
+    ASSERT_EQ(p.error, "");
+    EXPECT_EQ(p.options.screenshot, "w.png");
+    EXPECT_EQ(p.options.model, "kt644");
+}
+
+TEST(BenchOptions, MakesTheBenchItDescribes) {
+    BenchOptions o;
+    o.model = "kt655";
+    o.faults = {"noidn:11"};
+    auto bench = makeBench(o);
+    EXPECT_EQ(bench->model().name, "kt655");
+    EXPECT_EQ(bench->faults().silentGenerators.count(11), 1u);
+
+    o.traceFile = "/nonexistent-dir/trace.log";
+    EXPECT_THROW(makeBench(o), std::exception);
+}
+
+TEST(BenchOptions, ModelListHasOneLinePerModelWithPortsAndSources) {
+    const std::string text = modelListText();
+    EXPECT_NE(text.find("kt655\tKT655A\tK71 M83 M84\t4\t3\n"), std::string::npos) << text;
+    EXPECT_NE(text.find("kt611\tKT611A\t-\t2\t1\n"), std::string::npos) << text;
+    EXPECT_NE(usageText(Program::Cli).find("calculate"), std::string::npos);
+    EXPECT_EQ(usageText(Program::Gui).find("calculate"), std::string::npos);
+    EXPECT_EQ(versionText(Program::Cli), std::string("zentra-pulse-cli ") + ZP_VERSION + "\n");
+}
+
+}  // namespace
+}  // namespace zp::app

@@ -1,0 +1,135 @@
+#include "child_process.h"
+
+#include <fcntl.h>
+#include <poll.h>
+#include <signal.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <stdexcept>
+
+namespace zp::testing {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+pid_t spawn(const std::string& program, const std::vector<std::string>& args, const Env& env,
+            int outFd, int errFd) {
+    std::vector<std::string> argvStore{program};
+    argvStore.insert(argvStore.end(), args.begin(), args.end());
+    std::vector<char*> argv;
+    for (std::string& a : argvStore) argv.push_back(a.data());
+    argv.push_back(nullptr);
+    const pid_t pid = fork();
+    if (pid < 0) throw std::runtime_error("fork failed");
+    if (pid == 0) {
+        for (const auto& [name, value] : env) setenv(name.c_str(), value.c_str(), 1);
+        const int devNull = open("/dev/null", O_RDWR);
+        dup2(devNull, 0);
+        dup2(outFd >= 0 ? outFd : devNull, 1);
+        dup2(errFd >= 0 ? errFd : devNull, 2);
+        execv(program.c_str(), argv.data());
+        _exit(127);
+    }
+    return pid;
+}
+
+int statusOf(int raw) {
+    return WIFEXITED(raw) ? WEXITSTATUS(raw) : -1;
+}
+
+bool readSome(int fd, std::string& into) {
+    char buffer[4096];
+    const ssize_t n = read(fd, buffer, sizeof buffer);
+    if (n <= 0) return false;
+    into.append(buffer, static_cast<std::size_t>(n));
+    return true;
+}
+
+}  // namespace
+
+RunResult runProgram(const std::string& program, const std::vector<std::string>& args,
+                     const Env& env, std::chrono::milliseconds timeout) {
+    int outPipe[2];
+    int errPipe[2];
+    if (pipe(outPipe) != 0 || pipe(errPipe) != 0) throw std::runtime_error("pipe failed");
+    const pid_t pid = spawn(program, args, env, outPipe[1], errPipe[1]);
+    close(outPipe[1]);
+    close(errPipe[1]);
+    RunResult result;
+    const auto deadline = Clock::now() + timeout;
+    bool outOpen = true;
+    bool errOpen = true;
+    while ((outOpen || errOpen) && Clock::now() < deadline) {
+        pollfd fds[2] = {{outOpen ? outPipe[0] : -1, POLLIN, 0},
+                         {errOpen ? errPipe[0] : -1, POLLIN, 0}};
+        if (poll(fds, 2, 100) <= 0) continue;
+        if (fds[0].revents != 0) outOpen = readSome(outPipe[0], result.out);
+        if (fds[1].revents != 0) errOpen = readSome(errPipe[0], result.err);
+    }
+    close(outPipe[0]);
+    close(errPipe[0]);
+    int raw = 0;
+    if (outOpen || errOpen) {
+        kill(pid, SIGKILL);
+        waitpid(pid, &raw, 0);
+        result.status = -1;
+        return result;
+    }
+    waitpid(pid, &raw, 0);
+    result.status = statusOf(raw);
+    return result;
+}
+
+RunningProgram::RunningProgram(const std::string& program, const std::vector<std::string>& args,
+                               const Env& env) {
+    int errPipe[2];
+    if (pipe(errPipe) != 0) throw std::runtime_error("pipe failed");
+    pid_ = spawn(program, args, env, -1, errPipe[1]);
+    close(errPipe[1]);
+    errFd_ = errPipe[0];
+}
+
+RunningProgram::~RunningProgram() {
+    stop();
+    if (errFd_ >= 0) close(errFd_);
+}
+
+bool RunningProgram::waitForErr(const std::string& text, std::chrono::milliseconds timeout) {
+    const auto deadline = Clock::now() + timeout;
+    while (err_.find(text) == std::string::npos) {
+        if (Clock::now() >= deadline) return false;
+        pollfd fd{errFd_, POLLIN, 0};
+        if (poll(&fd, 1, 100) > 0 && !readSome(errFd_, err_))
+            return err_.find(text) != std::string::npos;
+    }
+    return true;
+}
+
+bool RunningProgram::running() {
+    if (pid_ < 0) return false;
+    int raw = 0;
+    if (waitpid(pid_, &raw, WNOHANG) == 0) return true;
+    pid_ = -1;  // reaped: never signal that number again
+    return false;
+}
+
+int RunningProgram::stop() {
+    if (pid_ < 0) return -1;
+    kill(pid_, SIGTERM);
+    int raw = 0;
+    for (int i = 0; i < 50; ++i) {
+        if (waitpid(pid_, &raw, WNOHANG) == pid_) {
+            pid_ = -1;
+            return statusOf(raw);
+        }
+        usleep(100000);
+    }
+    kill(pid_, SIGKILL);
+    waitpid(pid_, &raw, 0);
+    pid_ = -1;
+    return -1;
+}
+
+}  // namespace zp::testing

@@ -1,0 +1,158 @@
+// The programs as real processes: exit statuses, what they print, the second-start hand-over.
+
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <thread>
+
+#include "child_process.h"
+
+namespace zp::testing {
+namespace {
+
+using namespace std::chrono_literals;
+namespace fs = std::filesystem;
+
+const std::string kCli = ZP_CLI_PATH;
+const std::string kGui = ZP_GUI_PATH;
+const char* kUnreachable = "analyzer:Application.modelText=-999 Analyzer not responding";
+
+bool haveGui() {
+    return fs::exists(kGui);
+}
+
+fs::path scratch(const std::string& name) {
+    return fs::temp_directory_path() / ("zp-app-test-" + std::to_string(getpid()) + "-" + name);
+}
+
+Env guiEnv(const std::string& key) {
+    return {{"QT_QPA_PLATFORM", "offscreen"}, {"ZP_INSTANCE_KEY", key}};
+}
+
+TEST(CliProgram, SetsCalculatesAndShowsOnAFourPortAnalyzer) {
+    RunResult r =
+        runProgram(kCli, {"--analyzer", "sim:kt655", "set", "prf", "12345", "calculate", "show"});
+    ASSERT_EQ(r.status, 0) << r.err;
+    EXPECT_NE(r.out.find("set prf 12345 -> 12340 Hz\n"), std::string::npos) << r.out;
+    const auto json = r.out.find('{');
+    ASSERT_NE(json, std::string::npos);
+    const std::string body = r.out.substr(json);
+    const auto prf = body.find("\"VexoEdit_prf\"");
+    ASSERT_NE(prf, std::string::npos);
+    EXPECT_NE(body.find("12340", prf), std::string::npos);
+    EXPECT_NE(body.find("\"NumOutputs\": 6"), std::string::npos) << "six rows on kt655";
+    EXPECT_NE(body.find("R IF Gate :"), std::string::npos);
+}
+
+TEST(CliProgram, FailuresEndWithStatusOneAndAReasonOnStderr) {
+    RunResult bad = runProgram(kCli, {"frobnicate"});
+    EXPECT_EQ(bad.status, 1);
+    EXPECT_NE(bad.err.find("unknown action 'frobnicate'"), std::string::npos) << bad.err;
+
+    RunResult refused = runProgram(kCli, {"set", "prf", "1G", "show"});
+    EXPECT_EQ(refused.status, 1);
+    EXPECT_NE(refused.err.find("zentra-pulse-cli: set prf 1G: "), std::string::npos) << refused.err;
+    EXPECT_EQ(refused.out.find('{'), std::string::npos) << "show must not run after a failure";
+}
+
+TEST(CliProgram, BadCommandLinesEndWithStatusTwo) {
+    for (const std::vector<std::string>& args : {std::vector<std::string>{"--nope", "show"},
+                                                 {"--analyzer", "sim:kt999", "show"},
+                                                 {"--fault", "what", "show"},
+                                                 {}}) {
+        RunResult r = runProgram(kCli, args);
+        EXPECT_EQ(r.status, 2) << (args.empty() ? "(no arguments)" : args.front());
+        EXPECT_NE(r.err.find("zentra-pulse-cli: "), std::string::npos);
+    }
+}
+
+TEST(CliProgram, ListsModelsAndAnswersHelpAndVersion) {
+    RunResult r = runProgram(kCli, {"--list-models"});
+    ASSERT_EQ(r.status, 0);
+    for (const char* model : {"kt611", "kt622", "kt633", "kt644", "kt655"}) {
+        EXPECT_NE(r.out.find(std::string(model) + "\t"), std::string::npos) << model;
+    }
+    EXPECT_EQ(runProgram(kCli, {"--help"}).status, 0);
+    EXPECT_NE(runProgram(kCli, {"--version"}).out.find("zentra-pulse-cli " ZP_VERSION),
+              std::string::npos);
+}
+
+TEST(CliProgram, UnreachableAnalyzerEndsWithOneClearLine) {
+    RunResult r = runProgram(kCli, {"--fault", kUnreachable, "show"});
+    EXPECT_EQ(r.status, 1);
+    EXPECT_EQ(r.err,
+              "zentra-pulse-cli: the analyzer cannot be reached: -999 Analyzer not responding\n");
+    EXPECT_EQ(r.out, "");
+}
+
+TEST(CliProgram, WritesTheIoTraceAndNamesTheManual) {
+    const fs::path trace = scratch("trace.log");
+    RunResult r = runProgram(kCli, {"--trace-io", trace.string(), "help"});
+    ASSERT_EQ(r.status, 0) << r.err;
+    EXPECT_GT(fs::file_size(trace), 0u);
+    std::ifstream in(trace);
+    const std::string text((std::istreambuf_iterator<char>(in)), {});
+    EXPECT_NE(text.find("DIAG:HELP:FILE?"), std::string::npos);
+    fs::remove(trace);
+
+    const auto at = r.out.find("help -> ");
+    ASSERT_NE(at, std::string::npos) << r.out;
+    const std::string path = r.out.substr(at + 8, r.out.find(" (topic 1114)") - at - 8);
+    EXPECT_TRUE(fs::exists(path)) << path;
+    EXPECT_EQ(fs::path(path).filename(), "zentra-pulse.html");
+}
+
+TEST(GuiProgram, SecondStartHandsOverToTheRunningOneAndEnds) {
+    if (!haveGui()) GTEST_SKIP() << "built without the window program";
+    const std::string key = "zp-test-" + std::to_string(getpid());
+    RunningProgram first(kGui, {}, guiEnv(key));
+    // The first start is ready once its socket exists.
+    const char* tmp = std::getenv("TMPDIR");
+    const fs::path socket = fs::path(tmp && *tmp ? tmp : "/tmp") / key;
+    for (int i = 0; i < 200 && !fs::exists(socket); ++i) std::this_thread::sleep_for(50ms);
+    ASSERT_TRUE(fs::exists(socket)) << first.err();
+
+    const auto started = std::chrono::steady_clock::now();
+    RunResult second = runProgram(kGui, {}, guiEnv(key), 10s);
+    EXPECT_EQ(second.status, 0) << second.err;
+    EXPECT_LT(std::chrono::steady_clock::now() - started, 5s);
+    EXPECT_TRUE(first.waitForErr("zentra-pulse: raised by a second start", 10s)) << first.err();
+    EXPECT_TRUE(first.running());
+    first.stop();
+}
+
+TEST(GuiProgram, UnreachableAnalyzerEndsWithStatusOne) {
+    if (!haveGui()) GTEST_SKIP() << "built without the window program";
+    const fs::path png = scratch("never.png");
+    // The screenshot run is unattended: its message goes to stderr instead of a box.
+    RunResult r = runProgram(kGui, {"--screenshot", png.string(), "--fault", kUnreachable},
+                             guiEnv("zp-test-unreachable-" + std::to_string(getpid())));
+    EXPECT_EQ(r.status, 1);
+    EXPECT_NE(r.err.find("The analyzer cannot be reached: -999 Analyzer not responding"),
+              std::string::npos)
+        << r.err;
+    EXPECT_FALSE(fs::exists(png));
+}
+
+TEST(GuiProgram, ScreenshotWritesAPngAndBadOptionsEndWithStatusTwo) {
+    if (!haveGui()) GTEST_SKIP() << "built without the window program";
+    const fs::path png = scratch("window.png");
+    RunResult r = runProgram(kGui, {"--analyzer", "sim:kt655", "--screenshot", png.string()},
+                             guiEnv("zp-test-shot-" + std::to_string(getpid())));
+    ASSERT_EQ(r.status, 0) << r.err;
+    std::ifstream in(png, std::ios::binary);
+    char magic[4] = {};
+    in.read(magic, 4);
+    EXPECT_EQ(std::string(magic + 1, 3), "PNG");
+    fs::remove(png);
+
+    EXPECT_EQ(runProgram(kGui, {"--bogus"}, guiEnv("x")).status, 2);
+    EXPECT_EQ(runProgram(kGui, {"calculate"}, guiEnv("x")).status, 2);
+}
+
+}  // namespace
+}  // namespace zp::testing

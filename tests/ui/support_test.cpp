@@ -1,0 +1,133 @@
+// The Qt services: file filters, the busy pointer, the help file check, the single instance.
+
+#include <gtest/gtest.h>
+
+#include <QCursor>
+#include <QDir>
+#include <QElapsedTimer>
+#include <QFile>
+#include <QTemporaryDir>
+#include <QTextBrowser>
+
+#include "ui/help_viewer.h"
+#include "ui/single_instance.h"
+#include "ui_test_support.h"
+
+namespace zp::ui::testing {
+namespace {
+
+TEST(QtFileFilter, TurnsDescriptionPatternPairsIntoQtFilters) {
+    EXPECT_EQ(qtFileFilter("Zentra Pulsed Config (*.zpc)|*.zpc"), "Zentra Pulsed Config (*.zpc)");
+    EXPECT_EQ(qtFileFilter("Touchstone|*.s1p|Comma delimited|*.prn;*.csv"),
+              "Touchstone (*.s1p);;Comma delimited (*.prn *.csv)");
+    EXPECT_EQ(qtFileFilter(""), "");
+}
+
+TEST(QtInteraction, BusyPointerNeverStacksAndAlwaysComesBack) {
+    application();
+    QtInteraction ui({});
+    ASSERT_EQ(QApplication::overrideCursor(), nullptr);
+    ui.setPointer(Pointer::Busy);
+    ASSERT_NE(QApplication::overrideCursor(), nullptr);
+    EXPECT_EQ(QApplication::overrideCursor()->shape(), Qt::WaitCursor);
+    ui.setPointer(Pointer::Wait2);
+    ui.setPointer(Pointer::Busy);
+    ui.setPointer(Pointer::Normal);
+    EXPECT_EQ(QApplication::overrideCursor(), nullptr);
+    {
+        BusyPointer busy(ui);
+        EXPECT_NE(QApplication::overrideCursor(), nullptr);
+    }
+    EXPECT_EQ(QApplication::overrideCursor(), nullptr);
+    // Ending while busy puts the pointer back too.
+    {
+        QtInteraction other({});
+        other.setPointer(Pointer::Busy);
+    }
+    EXPECT_EQ(QApplication::overrideCursor(), nullptr);
+}
+
+class HelpFiles : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        application();
+        ASSERT_TRUE(root_.isValid());
+        QDir(root_.path()).mkpath("manual");
+        QDir(root_.path()).mkpath("elsewhere");
+        write("manual/zentra-pulse.html",
+              "<html><body><h1>Top</h1><p>filler</p>"
+              "<h2><a id=\"topic-1114\" name=\"topic-1114\"></a>Main window</h2></body></html>");
+        write("elsewhere/secret.html", "<p>not the manual</p>");
+    }
+    void write(const QString& relative, const QByteArray& text) {
+        QFile f(root_.filePath(relative));
+        ASSERT_TRUE(f.open(QIODevice::WriteOnly));
+        f.write(text);
+    }
+    QString manual() const { return root_.filePath("manual"); }
+
+    QTemporaryDir root_;
+};
+
+TEST_F(HelpFiles, OnlyExistingFilesInsideTheManualFolderAreShown) {
+    const HelpFileCheck ok = checkHelpFile(manual() + "/zentra-pulse.html", {manual()});
+    EXPECT_TRUE(ok.ok()) << ok.error.toStdString();
+
+    const HelpFileCheck missing = checkHelpFile(manual() + "/nothing.html", {manual()});
+    EXPECT_TRUE(missing.error.contains("was not found")) << missing.error.toStdString();
+
+    const HelpFileCheck outside =
+        checkHelpFile(root_.filePath("elsewhere/secret.html"), {manual()});
+    EXPECT_TRUE(outside.error.contains("is not part of the Zentra Pulse manual"));
+
+    // ".." cannot climb out, and a folder whose name merely starts like the manual's is not it.
+    EXPECT_FALSE(checkHelpFile(manual() + "/../elsewhere/secret.html", {manual()}).ok());
+    QDir(root_.path()).mkpath("manual2");
+    write("manual2/x.html", "x");
+    EXPECT_FALSE(checkHelpFile(root_.filePath("manual2/x.html"), {manual()}).ok());
+    EXPECT_FALSE(checkHelpFile(manual(), {manual()}).ok()) << "a folder is not a help file";
+    EXPECT_FALSE(checkHelpFile("", {manual()}).ok());
+    EXPECT_FALSE(checkHelpFile(manual() + "/zentra-pulse.html", {}).ok());
+}
+
+TEST_F(HelpFiles, ShowHelpOpensTheViewerAtTheTopicOrSaysWhyNot) {
+    QtInteraction ui({manual()});
+    ui.setUnattended(true);
+    EXPECT_FALSE(ui.showHelp(root_.filePath("elsewhere/secret.html").toStdString(), 1114));
+    EXPECT_EQ(ui.helpViewer(), nullptr);
+    EXPECT_TRUE(ui.lastMessage().contains("not part of the Zentra Pulse manual"));
+
+    EXPECT_TRUE(ui.showHelp((manual() + "/zentra-pulse.html").toStdString(), 1114));
+    ASSERT_NE(ui.helpViewer(), nullptr);
+    EXPECT_EQ(ui.helpViewer()->browser()->source().fragment(), "topic-1114");
+    EXPECT_TRUE(ui.helpViewer()->isVisible());
+}
+
+TEST(SingleInstance, SecondStartHandsOverAndTheFirstIsAskedToRaise) {
+    application();
+    const QString key = QStringLiteral("zp-ui-test-%1").arg(QCoreApplication::applicationPid());
+    SingleInstance first(key);
+    ASSERT_EQ(first.start(), SingleInstance::Role::Primary);
+    int raised = 0;
+    QObject::connect(&first, &SingleInstance::raiseRequested, [&] { ++raised; });
+
+    SingleInstance second(key);
+    EXPECT_EQ(second.start(), SingleInstance::Role::Secondary);
+    QElapsedTimer timer;
+    timer.start();
+    while (raised == 0 && timer.elapsed() < 5000) QCoreApplication::processEvents();
+    EXPECT_EQ(raised, 1);
+}
+
+TEST(SingleInstance, KeyIsNamedAfterTheUserUnlessOverridden) {
+    qputenv("ZP_INSTANCE_KEY", "");
+    const QString key = SingleInstance::defaultKey();
+    EXPECT_TRUE(key.startsWith("zentra-pulse-"));
+    EXPECT_FALSE(key.contains('/'));
+    qputenv("ZP_INSTANCE_KEY", "custom-key");
+    EXPECT_EQ(SingleInstance::defaultKey(), "custom-key");
+    qunsetenv("ZP_INSTANCE_KEY");
+}
+
+}  // namespace
+}  // namespace zp::ui::testing
