@@ -92,7 +92,7 @@ class SimAnalyzerState {
 // Parameters a model can measure: "A", "R1", "S21" ... (validity per port count).
 bool isMeasurableParameter(std::string_view parameter, int ports);
 
-// "CH1_S11_1"-style catalog entry names and the analyzer's ASCII number form.
+// The analyzer's ASCII number form for data transfers.
 std::string sdataField(double value);  // exactly 19 characters, "+1.23456789012E-001"
 
 }  // namespace zp::sim
