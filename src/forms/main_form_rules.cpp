@@ -22,6 +22,7 @@ double powerOfTen(int e) {
 // The exact decimal exponent: 10^e <= v < 10^(e+1). A single-precision logarithm rounds values
 // just below a power of ten up to it (9999.999 Hz would count as 10^4).
 int decimalExponent(double v) {
+    if (!(v > 0.0) || !std::isfinite(v)) return 0;
     int e = static_cast<int>(std::floor(std::log10(v)));
     while (powerOfTen(e) > v) --e;
     while (powerOfTen(e + 1) <= v) ++e;

@@ -75,13 +75,6 @@ TEST_F(Startup, FourPortThreeSourcesGrowsASixthRow) {
     EXPECT_TRUE(form.m_PulseConfig.enabled);
 }
 
-TEST_F(Startup, RowsStepEvenlyDownTheGateFrame) {
-    for (int row = 0; row < form.rowCount(); ++row) {
-        EXPECT_EQ(form.lbl_gate[row].geometry.top, 540 + 360 * row);
-        EXPECT_EQ(form.fieldGeometry.at(form.VexoEdit_width[row].name()).top, 480 + 360 * row);
-    }
-}
-
 TEST_F(Startup, UnlistedModelHasNoSwGatingDisabledAndNoPulseConfiguration) {
     bench.log = {};
     load(unlisted());
