@@ -6,6 +6,7 @@
 #include <netinet/tcp.h>
 #include <poll.h>
 #include <sys/socket.h>
+#include <sys/time.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -82,7 +83,7 @@ int connectOne(const addrinfo& ai, Clock::time_point deadline, std::string& why)
 
 RawSocketLink::RawSocketLink(const std::string& host, int port, std::chrono::milliseconds ioTimeout,
                              std::chrono::milliseconds connectTimeout)
-    : peer_(host + ":" + std::to_string(port)), timeout_(ioTimeout) {
+    : peer_(host + ":" + std::to_string(port)) {
     addrinfo hints{};
     hints.ai_family = AF_UNSPEC;
     hints.ai_socktype = SOCK_STREAM;
@@ -101,6 +102,16 @@ RawSocketLink::RawSocketLink(const std::string& host, int port, std::chrono::mil
     if (fd_ < 0) throw InstrumentError(kTransportError, "Cannot connect to " + peer_ + ": " + why);
     const int one = 1;
     ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
+    // From here on blocking calls with kernel timeouts: one system call per send or receive.
+    ::fcntl(fd_, F_SETFL, ::fcntl(fd_, F_GETFL) & ~O_NONBLOCK);
+    const auto seconds = std::chrono::duration_cast<std::chrono::seconds>(ioTimeout);
+    timeval tv{};
+    tv.tv_sec = static_cast<time_t>(seconds.count());
+    tv.tv_usec = static_cast<suseconds_t>(
+        std::chrono::duration_cast<std::chrono::microseconds>(ioTimeout - seconds).count());
+    if (tv.tv_sec == 0 && tv.tv_usec == 0) tv.tv_usec = 1000;  // zero would mean "wait forever"
+    ::setsockopt(fd_, SOL_SOCKET, SO_RCVTIMEO, &tv, sizeof tv);
+    ::setsockopt(fd_, SOL_SOCKET, SO_SNDTIMEO, &tv, sizeof tv);
 }
 
 RawSocketLink::~RawSocketLink() {
@@ -108,16 +119,13 @@ RawSocketLink::~RawSocketLink() {
 }
 
 void RawSocketLink::write(std::string_view text) {
-    const auto deadline = Clock::now() + timeout_;
     std::size_t sent = 0;
     while (sent < text.size()) {
         const ssize_t n = ::send(fd_, text.data() + sent, text.size() - sent, MSG_NOSIGNAL);
         if (n > 0) {
             sent += static_cast<std::size_t>(n);
         } else if (n < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) {
-            if (!waitFor(fd_, POLLOUT, deadline)) {
-                throw LinkFailure("write to " + peer_ + " timed out", true);
-            }
+            throw LinkFailure("write to " + peer_ + " timed out", true);
         } else if (n < 0 && errno != EINTR) {
             throw LinkFailure("write to " + peer_ + " failed: " + std::strerror(errno), false);
         }
@@ -125,7 +133,6 @@ void RawSocketLink::write(std::string_view text) {
 }
 
 std::string RawSocketLink::read(std::size_t maxChars) {
-    const auto deadline = Clock::now() + timeout_;
     while (true) {
         const std::size_t available = in_.size() - head_;
         // Line feed within the first maxChars characters?
@@ -154,19 +161,17 @@ std::string RawSocketLink::read(std::size_t maxChars) {
             return reply;
         }
 
-        const std::size_t old = in_.size();
-        in_.resize(old + kChunk);
-        const ssize_t n = ::recv(fd_, in_.data() + old, kChunk, 0);
-        in_.resize(old + static_cast<std::size_t>(n > 0 ? n : 0));
-        if (n > 0) continue;
+        const ssize_t n = ::recv(fd_, chunk_.data(), chunk_.size(), 0);
+        if (n > 0) {
+            in_.append(chunk_.data(), static_cast<std::size_t>(n));
+            continue;
+        }
         if (n == 0) throw LinkFailure(peer_ + " closed the connection", false);
         if (errno == EINTR) continue;
-        if (errno != EAGAIN && errno != EWOULDBLOCK) {
-            throw LinkFailure("read from " + peer_ + " failed: " + std::strerror(errno), false);
-        }
-        if (!waitFor(fd_, POLLIN, deadline)) {
+        if (errno == EAGAIN || errno == EWOULDBLOCK) {
             throw LinkFailure("read from " + peer_ + " timed out", true);
         }
+        throw LinkFailure("read from " + peer_ + " failed: " + std::strerror(errno), false);
     }
 }
 

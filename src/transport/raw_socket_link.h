@@ -4,6 +4,7 @@
 
 #include <chrono>
 #include <string>
+#include <vector>
 
 #include "transport/device_link.h"
 
@@ -11,7 +12,8 @@ namespace zp::transport {
 
 class RawSocketLink : public DeviceLink {
   public:
-    // Connects within connectTimeout; every later write or read gives up after ioTimeout.
+    // Connects within connectTimeout; a later write or read gives up when no data could be
+    // moved for ioTimeout.
     // Throws InstrumentError naming host:port when the connection cannot be made.
     RawSocketLink(const std::string& host, int port, std::chrono::milliseconds ioTimeout,
                   std::chrono::milliseconds connectTimeout = std::chrono::seconds(5));
@@ -29,10 +31,10 @@ class RawSocketLink : public DeviceLink {
 
   private:
     int fd_ = -1;
-    std::string peer_;  // "host:port" for messages
-    std::chrono::milliseconds timeout_;
-    std::string in_;           // received, not yet delivered
-    std::size_t head_ = 0;     // start of undelivered data in in_
+    std::string peer_;                                        // "host:port" for messages
+    std::vector<char> chunk_ = std::vector<char>(64 * 1024);  // receive buffer
+    std::string in_;                                          // received, not yet delivered
+    std::size_t head_ = 0;                                    // start of undelivered data in in_
     std::size_t scanned_ = 0;  // in_[head_, scanned_) holds no line feed
 };
 

@@ -1,0 +1,154 @@
+// Raw SCPI transport against the loopback server: query round trips and write-then-query pairs
+// per second through the bus, beside a bare blocking-socket loop, and a 4 MiB reply.
+
+#include <benchmark/benchmark.h>
+#include <netinet/in.h>
+#include <netinet/tcp.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <map>
+#include <memory>
+#include <stdexcept>
+#include <string>
+
+#include "sim/scpi_server.h"
+#include "sim/sim_generator.h"
+#include "transport/transport_factory.h"
+
+namespace {
+
+constexpr std::size_t kBigSize = 4u << 20;
+
+struct Loopback {
+    Loopback() {
+        generators[11] = std::make_unique<zp::sim::SimGenerator>(11, "");
+        auto forward = zp::sim::ScpiServer::forGenerators(generators);
+        std::string big(kBigSize - 1, 'Z');
+        big += '\n';
+        server = std::make_unique<zp::sim::ScpiServer>(
+            std::map<int, int>{{11, 0}},
+            [forward, big](int address, std::string_view line) -> std::optional<std::string> {
+                if (line == "BIG?") return big;
+                return forward(address, line);
+            });
+    }
+    std::map<int, std::unique_ptr<zp::sim::SimGenerator>> generators;
+    std::unique_ptr<zp::sim::ScpiServer> server;
+};
+
+Loopback& loopback() {
+    static Loopback instance;
+    return instance;
+}
+
+// The baseline: what a plain blocking client with Nagle off achieves.
+class BareSocket {
+  public:
+    explicit BareSocket(int port) : fd_(::socket(AF_INET, SOCK_STREAM, 0)) {
+        sockaddr_in a{};
+        a.sin_family = AF_INET;
+        a.sin_port = htons(static_cast<std::uint16_t>(port));
+        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+        if (::connect(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a) != 0) {
+            throw std::runtime_error("connect");
+        }
+        const int one = 1;
+        ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
+    }
+    ~BareSocket() { ::close(fd_); }
+    void send(std::string_view text) {
+        if (::send(fd_, text.data(), text.size(), MSG_NOSIGNAL) !=
+            static_cast<ssize_t>(text.size())) {
+            throw std::runtime_error("send");
+        }
+    }
+    std::string line() {
+        std::string out;
+        char buffer[256];
+        while (out.empty() || out.back() != '\n') {
+            const ssize_t n = ::recv(fd_, buffer, sizeof buffer, 0);
+            if (n <= 0) throw std::runtime_error("recv");
+            out.append(buffer, static_cast<std::size_t>(n));
+        }
+        return out;
+    }
+
+  private:
+    int fd_;
+};
+
+void BM_BareSocketQuery(benchmark::State& state) {
+    BareSocket s(loopback().server->port(11));
+    for (auto _ : state) {
+        s.send("*OPC?\n");
+        benchmark::DoNotOptimize(s.line());
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+BENCHMARK(BM_BareSocketQuery)->UseRealTime();
+
+void BM_TransportQuery(benchmark::State& state) {
+    const std::string resource =
+        "TCPIP0::127.0.0.1::" + std::to_string(loopback().server->port(11)) + "::SOCKET";
+    auto bus = zp::makeTransportBus({{11, resource}}, nullptr);
+    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
+    std::string buffer;
+    for (auto _ : state) {
+        bus->writeText(d, "*OPC?\n");
+        buffer.assign(2, ' ');
+        bus->readText(d, buffer);
+        if (bus->status() != 0) state.SkipWithError("bus error");
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+BENCHMARK(BM_TransportQuery)->UseRealTime();
+
+void BM_BareSocketWriteThenQuery(benchmark::State& state) {
+    BareSocket s(loopback().server->port(11));
+    for (auto _ : state) {
+        s.send(":SOUR:PULS:DEL1 1E-06\n");
+        s.send("*OPC?\n");
+        benchmark::DoNotOptimize(s.line());
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+BENCHMARK(BM_BareSocketWriteThenQuery)->UseRealTime();
+
+void BM_TransportWriteThenQuery(benchmark::State& state) {
+    const std::string resource =
+        "TCPIP0::127.0.0.1::" + std::to_string(loopback().server->port(11)) + "::SOCKET";
+    auto bus = zp::makeTransportBus({{11, resource}}, nullptr);
+    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
+    std::string buffer;
+    for (auto _ : state) {
+        bus->writeText(d, ":SOUR:PULS:DEL1 1E-06\n");
+        bus->writeText(d, "*OPC?\n");
+        buffer.assign(2, ' ');
+        bus->readText(d, buffer);
+        if (bus->status() != 0) state.SkipWithError("bus error");
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+BENCHMARK(BM_TransportWriteThenQuery)->UseRealTime();
+
+void BM_TransportFourMebibyteReply(benchmark::State& state) {
+    const std::string resource =
+        "TCPIP0::127.0.0.1::" + std::to_string(loopback().server->port(11)) + "::SOCKET";
+    auto bus = zp::makeTransportBus({{11, resource}}, nullptr);
+    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
+    std::string buffer;
+    for (auto _ : state) {
+        bus->writeText(d, "BIG?\n");
+        buffer.assign(kBigSize + 16, ' ');
+        bus->readText(d, buffer);
+        if (bus->status() != 0 || buffer.size() != kBigSize || buffer.back() != '\n' ||
+            buffer.find_first_not_of('Z') != kBigSize - 1) {
+            state.SkipWithError("reply damaged");
+        }
+    }
+    state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(kBigSize));
+}
+BENCHMARK(BM_TransportFourMebibyteReply)->UseRealTime()->Unit(benchmark::kMillisecond);
+
+}  // namespace
