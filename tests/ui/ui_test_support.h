@@ -2,6 +2,8 @@
 // What the widget tests share: the application object, a bench with its window, typing.
 
 #include <QApplication>
+#include <QDir>
+#include <QFileInfo>
 #include <QKeyEvent>
 #include <QLineEdit>
 #include <memory>
@@ -14,18 +16,19 @@
 
 namespace zp::ui::testing {
 
+// The application object lives from the start to the end of the test run (qt_environment.cpp), so
+// that it goes before Qt's own statics do.
 inline QApplication& application() {
-    static int argc = 1;
-    static char name[] = "test_ui";
-    static char* argv[] = {name, nullptr};
-    static QApplication app(argc, argv);
-    return app;
+    return *qApp;
 }
 
-// The manual in the source tree, when the tests run from ctest.
+// The manual in the source tree: from ZP_SOURCE_DIR, else from where this file lies.
 inline QString manualFolder() {
     const QString source = qEnvironmentVariable("ZP_SOURCE_DIR");
-    return source.isEmpty() ? QString() : source + QStringLiteral("/docs/help");
+    if (!source.isEmpty()) return source + QStringLiteral("/docs/help");
+    const QDir here = QFileInfo(QStringLiteral(__FILE__)).absoluteDir();
+    return here.exists() ? QDir::cleanPath(here.absoluteFilePath(QStringLiteral("../../docs/help")))
+                         : QString();
 }
 
 struct Window {
