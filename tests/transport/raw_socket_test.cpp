@@ -174,6 +174,28 @@ TEST_F(TransportBusTest, AddressWithoutResourceAndUnreachableResourceThrow) {
     EXPECT_THROW(bus->openDevice(1, 11, 0, 13, 1, 0), InstrumentError);
 }
 
+TEST_F(TransportBusTest, WriteThenQueryDoesNotWaitForDelayedAcks) {
+    // With Nagle on, every query behind an unacknowledged write waits ~40 ms for the ACK.
+    auto bus = makeBus();
+    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
+    const auto start = std::chrono::steady_clock::now();
+    std::string buffer;
+    for (int i = 0; i < 100; ++i) {
+        bus->writeText(d, ":SOUR:PULS:DEL1 1E-06\n");
+        bus->writeText(d, "*OPC?\n");
+        buffer.assign(2, ' ');
+        bus->readText(d, buffer);
+        ASSERT_EQ(buffer, "1\n");
+    }
+    EXPECT_LT(std::chrono::steady_clock::now() - start, 2s);
+}
+
+TEST_F(TransportBusTest, FailedOpenIsTraced) {
+    auto bus = makeBus();
+    EXPECT_THROW(bus->openDevice(0, 13, 0, 13, 1, 0), InstrumentError);
+    EXPECT_EQ(trace.lines().back(), "BUS 13 error No bus resource is given for GPIB address 13");
+}
+
 TEST_F(TransportBusTest, InvalidDescriptorSetsErr) {
     auto bus = makeBus();
     bus->writeText(42, "*IDN?\n");
