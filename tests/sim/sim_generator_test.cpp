@@ -85,6 +85,25 @@ TEST_F(SimGeneratorTest, LongShortCaseRootAndSuffixForms) {
     EXPECT_EQ(query("SYSTEM:ERROR:NEXT?"), "+0,\"No error\"\n");
 }
 
+TEST_F(SimGeneratorTest, NumberFormsTheProgramMaySend) {
+    const struct {
+        const char* text;
+        double seconds;
+    } cases[] = {{"1E-06", 1e-6}, {"1e-6", 1e-6},  {"1.5E-06", 1.5e-6}, {".5us", 0.5e-6},
+                 {"5.", 5.0},     {"+2E-4", 2e-4}, {"0", 0.0},          {"250 ns", 250e-9},
+                 {"3PS", 3e-12},  {"7ms", 7e-3}};
+    gen.handle(":SOUR:FREQ 0.1");  // 10 s period leaves room for every width
+    for (const auto& c : cases) {
+        gen.handle(std::string(":SOUR:PULS:WIDT1 ") + c.text);
+        EXPECT_DOUBLE_EQ(out(1).width, c.seconds) << c.text;
+        EXPECT_EQ(nextError(), "+0,\"No error\"\n") << c.text;
+    }
+    for (const char* junk : {"1E", "E5", "--1", "1,5", "NAN", "1e5x7"}) {
+        gen.handle(std::string(":SOUR:PULS:WIDT1 ") + junk);
+        EXPECT_NE(nextError(), "+0,\"No error\"\n") << junk;
+    }
+}
+
 TEST_F(SimGeneratorTest, QueriesReportSettingsAndJoinWithSemicolons) {
     gen.handle(":SOUR:FREQ 1.5E+03;:OUTP1:STAT ON");
     EXPECT_EQ(query(":SOUR:FREQ?;:OUTP1:STAT?;*OPC?"), "1500;1;1\n");
