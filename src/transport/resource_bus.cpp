@@ -55,9 +55,10 @@ std::int16_t ResourceBus::openDevice(int board, int primaryAddress, int, int tim
         throw InstrumentError(kTransportError, "No free GPIB device descriptor");
     }
     try {
-        auto link = factory_(it->second, timeoutCode);
+        auto& link = links_[primaryAddress];
+        if (!link) link = factory_(it->second, timeoutCode);
         const std::int16_t descriptor = next_++;
-        devices_.emplace(descriptor, Device{primaryAddress, std::move(link)});
+        devices_.emplace(descriptor, Device{primaryAddress, link});
         status_ = 0;
         return descriptor;
     } catch (const InstrumentError&) {

@@ -1,6 +1,8 @@
 #pragma once
 // An InstrumentBus whose devices are reached through resources (socket, VXI-11, GPIB board)
 // instead of one GPIB board: openDevice(0, N, ...) opens the link given for address N.
+// Descriptors opened for the same address share one link, as two descriptors for one GPIB
+// device talk to the same instrument (many LAN instruments accept one socket only).
 // Status word as on a GPIB board: 0 after a good call, ERR after a failed one, ERR|TIMO after a
 // timeout. Reads return at most buffer.size() characters; the rest comes with the next read.
 
@@ -43,7 +45,7 @@ class ResourceBus : public InstrumentBus, public BusErrorSource {
   private:
     struct Device {
         int address;
-        std::unique_ptr<DeviceLink> link;
+        std::shared_ptr<DeviceLink> link;
     };
     Device* find(std::int16_t descriptor);
     template <typename Call>
@@ -53,6 +55,7 @@ class ResourceBus : public InstrumentBus, public BusErrorSource {
     std::map<int, std::string> texts_;
     LinkFactory factory_;
     std::map<std::int16_t, Device> devices_;
+    std::map<int, std::shared_ptr<DeviceLink>> links_;  // per address
     std::int16_t next_ = 1;
     std::uint16_t status_ = 0;
     std::string lastError_;

@@ -3,6 +3,7 @@
 #include <stdexcept>
 
 #include "transport/resource.h"
+#include "transport/resource_bus.h"
 #include "transport/transport_factory.h"
 
 namespace zp {
@@ -74,3 +75,73 @@ TEST(ParseResource, Kinds) {
 
 }  // namespace
 }  // namespace zp
+
+namespace zp::transport {
+namespace {
+
+class ScriptedLink : public DeviceLink {
+  public:
+    void write(std::string_view text) override { written += text; }
+    std::string read(std::size_t maxChars) override {
+        if (reply.empty()) throw LinkFailure("no reply", true);
+        std::string out = reply.substr(0, maxChars);
+        reply.erase(0, out.size());
+        return out;
+    }
+    void clear() override { throw LinkFailure("clear refused", false); }
+    std::string written;
+    std::string reply = "+0,\"No error\"\n";
+};
+
+TEST(ResourceBus, DescriptorsOfOneAddressShareOneLink) {
+    int opened = 0;
+    ScriptedLink* last = nullptr;
+    ResourceBus bus({{11, "GPIB0::11::INSTR"}, {12, "GPIB0::12::INSTR"}},
+                    [&](const Resource& r, int timeoutCode) -> std::unique_ptr<DeviceLink> {
+                        EXPECT_EQ(std::get<GpibResource>(r).primary, opened == 0 ? 11 : 12);
+                        EXPECT_EQ(timeoutCode, 13);
+                        ++opened;
+                        auto link = std::make_unique<ScriptedLink>();
+                        last = link.get();
+                        return link;
+                    });
+    const auto a = bus.openDevice(0, 11, 0, 13, 1, 0);
+    const auto b = bus.openDevice(0, 11, 0, 13, 1, 0);
+    EXPECT_NE(a, b);
+    EXPECT_EQ(opened, 1);
+    bus.writeText(a, "A\n");
+    bus.writeText(b, "B\n");
+    EXPECT_EQ(last->written, "A\nB\n");
+    // A reply longer than the buffer is read in pieces, across descriptors of the device.
+    std::string buffer(3, ' ');
+    bus.readText(a, buffer);
+    EXPECT_EQ(buffer, "+0,");
+    buffer.assign(100, ' ');
+    bus.readText(b, buffer);
+    EXPECT_EQ(buffer, "\"No error\"\n");
+    bus.openDevice(0, 12, 0, 13, 1, 0);
+    EXPECT_EQ(opened, 2);
+}
+
+TEST(ResourceBus, LinkFailuresSetTheStatusWordAndGiveTheReason) {
+    ResourceBus bus({{11, "GPIB0::11::INSTR"}},
+                    [](const Resource&, int) { return std::make_unique<ScriptedLink>(); });
+    const auto d = bus.openDevice(0, 11, 0, 13, 1, 0);
+    bus.clearDevice(d);
+    EXPECT_EQ(bus.status(), InstrumentBus::kStatusError);
+    EXPECT_EQ(bus.lastErrorText(), "clear refused");
+    std::string buffer(100, ' ');
+    bus.readText(d, buffer);  // first read empties the scripted reply
+    bus.readText(d, buffer);
+    EXPECT_EQ(bus.status(), InstrumentBus::kStatusError | InstrumentBus::kStatusTimeout);
+    EXPECT_EQ(buffer, "+0,\"No error\"\n");  // unchanged by the failed read
+    bus.writeText(d, "X\n");
+    EXPECT_EQ(bus.status(), 0);
+}
+
+TEST(ResourceBus, MalformedResourceIsRefusedUpFront) {
+    EXPECT_THROW(ResourceBus({{11, "GPIB0::99::INSTR"}}), std::invalid_argument);
+}
+
+}  // namespace
+}  // namespace zp::transport
