@@ -13,8 +13,14 @@ inline constexpr Bool16 kFalse = 0;
 inline constexpr Check16 kChecked = 1;
 inline constexpr Check16 kUnchecked = 0;
 
-constexpr Bool16 toBool16(bool b) { return b ? kTrue : kFalse; }
-constexpr bool isTrue(Bool16 b) { return b != 0; }
-constexpr bool isChecked(Check16 c) { return c == kChecked; }
+constexpr Bool16 toBool16(bool b) {
+    return b ? kTrue : kFalse;
+}
+constexpr bool isTrue(Bool16 b) {
+    return b != 0;
+}
+constexpr bool isChecked(Check16 c) {
+    return c == kChecked;
+}
 
 }  // namespace zp

@@ -11,11 +11,12 @@ namespace zp {
 
 // Raised when a value does not fit the whole-number type it is converted to.
 class RangeError : public std::range_error {
-public:
+  public:
     using std::range_error::range_error;
 };
 
-// ln x / ln 10 in double precision, as the timing rules expect (FLog10(1000) == 2.9999999999999996).
+// ln x / ln 10 in double precision, as the timing rules expect (FLog10(1000)
+// == 2.9999999999999996).
 double FLog10(double x);
 
 // Rounds to the nearest whole number, ties to even.

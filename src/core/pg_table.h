@@ -43,7 +43,7 @@ struct PGRow {
 };
 
 class PGTable {
-public:
+  public:
     PGTable() = default;
     explicit PGTable(int rows) { resize(rows); }
 
@@ -60,7 +60,7 @@ public:
     // and zp::RangeError for a value outside the column's type.
     PGRow readRow(int row) const;
 
-private:
+  private:
     void checkRow(int row) const;
     std::vector<std::vector<PGCell>> cells_;
 };

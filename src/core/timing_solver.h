@@ -12,7 +12,7 @@
 namespace zp {
 
 class TimingSolver {
-public:
+  public:
     virtual ~TimingSolver() = default;
 
     virtual void SolveExternal(double& prf, std::int32_t& ifCount, std::int32_t& ifbwHz,

@@ -11,7 +11,7 @@
 namespace zp {
 
 class AnalyzerCaps {
-public:
+  public:
     virtual ~AnalyzerCaps() = default;
     virtual int portCount() = 0;
     virtual int sourceCount() = 0;
@@ -21,19 +21,19 @@ public:
 };
 
 class MessageArea {
-public:
+  public:
     virtual ~MessageArea() = default;
     virtual void setText(const std::string& text) = 0;
 };
 
 class CommandParser {
-public:
+  public:
     virtual ~CommandParser() = default;
     virtual std::string parse(const std::string& command) = 0;
 };
 
 class Measurement {
-public:
+  public:
     virtual ~Measurement() = default;
     virtual bool correctionOn() = 0;
     virtual int correctionType() = 0;
@@ -42,7 +42,7 @@ public:
 };
 
 class IfConfiguration {
-public:
+  public:
     virtual ~IfConfiguration() = default;
     virtual void setReceiverSwitch(const std::string& selector, bool on) = 0;
     virtual void setReceiverGain(const std::string& receiver, int gainState) = 0;
@@ -56,14 +56,14 @@ public:
 };
 
 class PathElement {
-public:
+  public:
     virtual ~PathElement() = default;
     virtual void setValue(const std::string& value) = 0;
     virtual std::string value() = 0;
 };
 
 class PathConfiguration {
-public:
+  public:
     virtual ~PathConfiguration() = default;
     virtual std::unique_ptr<PathElement> element(const std::string& name) = 0;
     virtual std::vector<std::string> elementNames() = 0;
@@ -71,7 +71,7 @@ public:
 
 // The analyzer's internal pulse generators 0 to 4 (1 to 4 drive the pulsed signals).
 class InternalPulseGenerator {
-public:
+  public:
     virtual ~InternalPulseGenerator() = default;
     virtual void setPeriod(double seconds) = 0;
     virtual double period() = 0;
@@ -86,7 +86,7 @@ public:
 };
 
 class SignalProcessingModule {
-public:
+  public:
     virtual ~SignalProcessingModule() = default;
     virtual void setFilterType(const std::string& type) = 0;
     virtual void setFilterParameter(const std::string& name, double value) = 0;
@@ -98,7 +98,7 @@ public:
 };
 
 class Channel {
-public:
+  public:
     virtual ~Channel() = default;
     virtual int channelNumber() = 0;
     virtual void beginChannelSetup(bool flag) = 0;
@@ -110,8 +110,8 @@ public:
     virtual std::unique_ptr<PathConfiguration> pathConfiguration() = 0;    // "PathConfiguration"
     virtual std::unique_ptr<InternalPulseGenerator> pulseGenerator() = 0;  // "PulseGenerator"
     virtual std::unique_ptr<SignalProcessingModule> signalProcessingModule() = 0;  // "...Four"
-    virtual void setFrequencyOffsetState(int state) = 0;               // "FrequencyOffsetState"
-    virtual void setFrequencyOffsetFrequency(double hz) = 0;           // "FrequencyOffsetFrequency"
+    virtual void setFrequencyOffsetState(int state) = 0;      // "FrequencyOffsetState"
+    virtual void setFrequencyOffsetFrequency(double hz) = 0;  // "FrequencyOffsetFrequency"
     virtual std::vector<std::string> getSupportedALCModes(int port) = 0;  // "GetSupportedALCModes"
     virtual void setALCLevelingMode(int port, int mode) = 0;              // "ALCLevelingMode"
 
@@ -128,14 +128,14 @@ public:
 };
 
 class ChannelCollection {
-public:
+  public:
     virtual ~ChannelCollection() = default;
     virtual int count() = 0;
     virtual std::unique_ptr<Channel> item(int oneBasedIndex) = 0;
 };
 
 class AnalyzerApplication {
-public:
+  public:
     virtual ~AnalyzerApplication() = default;
     virtual std::unique_ptr<Channel> currentChannel() = 0;
     virtual std::unique_ptr<ChannelCollection> channels() = 0;

@@ -14,7 +14,7 @@ namespace zp {
 class IoTrace;
 
 class Bench {
-public:
+  public:
     virtual ~Bench() = default;
     // A new connection to the analyzer; throws InstrumentError when it cannot be reached.
     virtual std::unique_ptr<AnalyzerApplication> connectAnalyzer() = 0;

@@ -7,7 +7,7 @@
 namespace zp {
 
 class InstrumentBus {
-public:
+  public:
     virtual ~InstrumentBus() = default;
 
     // Bit of the status word that says the last call failed, and the timeout bit.

@@ -8,14 +8,14 @@
 namespace zp {
 
 class InstrumentError : public std::runtime_error {
-public:
+  public:
     InstrumentError(long number, std::string description)
         : std::runtime_error(description), number_(number), description_(std::move(description)) {}
 
     long number() const { return number_; }
     const std::string& description() const { return description_; }
 
-private:
+  private:
     long number_;
     std::string description_;
 };
@@ -28,6 +28,8 @@ inline constexpr long kCancelError = 32755;
 // Analyzer errors whose description begins "+106" or "+143" are skipped: the procedure goes on
 // with its next step.
 bool isSkippableError(std::string_view description);
-inline bool isSkippableError(const InstrumentError& e) { return isSkippableError(e.description()); }
+inline bool isSkippableError(const InstrumentError& e) {
+    return isSkippableError(e.description());
+}
 
 }  // namespace zp

@@ -2,8 +2,8 @@
 // The I/O trace: every analyzer call and every bus text, in order. docs/io-trace.md fixes the line
 // format; scripts and tests rely on it.
 
-#include <functional>
 #include <fstream>
+#include <functional>
 #include <mutex>
 #include <string>
 #include <string_view>
@@ -12,7 +12,7 @@
 namespace zp {
 
 class IoTrace {
-public:
+  public:
     // An analyzer call: object path, operation, arguments as text, reply as text ("" for none).
     void analyzerCall(std::string_view object, std::string_view operation,
                       std::string_view arguments, std::string_view reply);
@@ -32,7 +32,7 @@ public:
     // Quoting used by the trace: C-style escapes for control characters, quotes and backslashes.
     static std::string quote(std::string_view text);
 
-private:
+  private:
     void add(std::string line);
     mutable std::mutex mutex_;
     std::vector<std::string> lines_;

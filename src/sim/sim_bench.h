@@ -34,7 +34,7 @@ inline constexpr const char* kDefaultModel = "kt622";
 class SimAnalyzerState;  // the analyzer's settings, shared by every connection
 
 class SimBench : public Bench {
-public:
+  public:
     // Throws std::invalid_argument for an unknown model name (the message lists the known ones).
     explicit SimBench(std::string_view modelName = kDefaultModel, SimFaults faults = {},
                       std::vector<int> generatorAddresses = {11, 12, 13});
@@ -54,7 +54,7 @@ public:
     SimGenerator* generator(int address);  // nullptr when none at that address
     SimAnalyzerState& analyzer() { return *analyzer_; }
 
-private:
+  private:
     SimModel model_;
     SimFaults faults_;
     IoTrace trace_;

@@ -257,16 +257,16 @@ const std::vector<CommandSpec>& commandTable() {
 bool matchPattern(std::span<const char* const> pattern, std::span<const HeaderNode> nodes,
                   std::optional<int>& suffix) {
     if (pattern.empty()) return nodes.empty();
-    std::string_view spec = pattern.front();
-    const bool optional = spec.front() == '[';
-    if (optional) spec = spec.substr(1, spec.size() - 2);
-    const bool takesSuffix = spec.back() == '#';
-    if (takesSuffix) spec.remove_suffix(1);
+    std::string_view keyword = pattern.front();
+    const bool optional = keyword.front() == '[';
+    if (optional) keyword = keyword.substr(1, keyword.size() - 2);
+    const bool takesSuffix = keyword.back() == '#';
+    if (takesSuffix) keyword.remove_suffix(1);
 
     if (optional && matchPattern(pattern.subspan(1), nodes, suffix)) return true;
     if (nodes.empty()) return false;
     const HeaderNode& node = nodes.front();
-    if (!matchesKeyword(node.mnemonic, spec)) return false;
+    if (!matchesKeyword(node.mnemonic, keyword)) return false;
     if (node.suffix && !takesSuffix) return false;
     const auto saved = suffix;
     if (takesSuffix) suffix = node.suffix;
@@ -367,10 +367,10 @@ std::optional<std::string> SimGenerator::handle(std::string_view line) {
                 context.query = parsed.query;
                 const CommandSpec* found = nullptr;
                 std::optional<int> suffix;
-                for (const auto& spec : commandTable()) {
+                for (const auto& entry : commandTable()) {
                     suffix.reset();
-                    if (matchPattern(spec.pattern, parsed.nodes, suffix)) {
-                        found = &spec;
+                    if (matchPattern(entry.pattern, parsed.nodes, suffix)) {
+                        found = &entry;
                         break;
                     }
                 }

@@ -12,10 +12,10 @@ namespace zp::sim {
 struct SimGeneratorOutput {
     bool on = false;
     bool inverted = false;
-    double width = 1e-6;   // s
-    double delay = 0.0;    // s
-    double high = 5.0;     // V
-    double low = 0.0;      // V
+    double width = 1e-6;          // s
+    double delay = 0.0;           // s
+    double high = 5.0;            // V
+    double low = 0.0;             // V
     double loadImpedance = 50.0;  // ohm
 };
 
@@ -32,7 +32,7 @@ struct SimGeneratorState {
 };
 
 class SimGenerator {
-public:
+  public:
     SimGenerator(int address, std::string identity);
 
     int address() const { return address_; }
@@ -46,7 +46,7 @@ public:
     void pushError(const std::string& entry);
     void preset();
 
-private:
+  private:
     int address_;
     std::string identity_;
     SimGeneratorState state_;

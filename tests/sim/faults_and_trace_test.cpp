@@ -42,7 +42,7 @@ TEST(SimFaultsTest, RejectsBadSpecsListingTheAcceptedForms) {
                 << e.what();
         }
         EXPECT_TRUE(f.analyzer.empty() && f.silentGenerators.empty() && !f.malformedData)
-            << "a rejected spec changes nothing: " << bad;
+            << "a rejected fault changes nothing: " << bad;
     }
 }
 
