@@ -7,6 +7,8 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <cstdint>
+#include <initializer_list>
 #include <map>
 #include <memory>
 #include <stdexcept>
@@ -78,71 +80,70 @@ class BareSocket {
     int fd_;
 };
 
-void BM_BareSocketQuery(benchmark::State& state) {
+// Every command goes out in turn; the last one is the query whose one-line reply is read back.
+using Commands = std::initializer_list<std::string_view>;
+
+void bareRoundTrips(benchmark::State& state, Commands commands) {
     BareSocket s(loopback().server->port(11));
     for (auto _ : state) {
-        s.send("*OPC?\n");
+        for (const auto command : commands) s.send(command);
         benchmark::DoNotOptimize(s.line());
     }
     state.SetItemsProcessed(state.iterations());
+}
+
+struct LoopbackDevice {
+    LoopbackDevice()
+        : bus(zp::makeTransportBus(
+              {{11,
+                "TCPIP0::127.0.0.1::" + std::to_string(loopback().server->port(11)) + "::SOCKET"}},
+              nullptr)),
+          descriptor(bus->openDevice(0, 11, 0, 13, 1, 0)) {}
+    std::unique_ptr<zp::InstrumentBus> bus;
+    std::int16_t descriptor;
+};
+
+void transportRoundTrips(benchmark::State& state, Commands commands) {
+    LoopbackDevice device;
+    std::string buffer;
+    for (auto _ : state) {
+        for (const auto command : commands)
+            device.bus->writeText(device.descriptor, std::string(command));
+        buffer.assign(2, ' ');
+        device.bus->readText(device.descriptor, buffer);
+        if (device.bus->status() != 0) state.SkipWithError("bus error");
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+
+void BM_BareSocketQuery(benchmark::State& state) {
+    bareRoundTrips(state, {"*OPC?\n"});
 }
 BENCHMARK(BM_BareSocketQuery)->UseRealTime();
 
 void BM_TransportQuery(benchmark::State& state) {
-    const std::string resource =
-        "TCPIP0::127.0.0.1::" + std::to_string(loopback().server->port(11)) + "::SOCKET";
-    auto bus = zp::makeTransportBus({{11, resource}}, nullptr);
-    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
-    std::string buffer;
-    for (auto _ : state) {
-        bus->writeText(d, "*OPC?\n");
-        buffer.assign(2, ' ');
-        bus->readText(d, buffer);
-        if (bus->status() != 0) state.SkipWithError("bus error");
-    }
-    state.SetItemsProcessed(state.iterations());
+    transportRoundTrips(state, {"*OPC?\n"});
 }
 BENCHMARK(BM_TransportQuery)->UseRealTime();
 
 void BM_BareSocketWriteThenQuery(benchmark::State& state) {
-    BareSocket s(loopback().server->port(11));
-    for (auto _ : state) {
-        s.send(":SOUR:PULS:DEL1 1E-06\n");
-        s.send("*OPC?\n");
-        benchmark::DoNotOptimize(s.line());
-    }
-    state.SetItemsProcessed(state.iterations());
+    bareRoundTrips(state, {":SOUR:PULS:DEL1 1E-06\n", "*OPC?\n"});
 }
 BENCHMARK(BM_BareSocketWriteThenQuery)->UseRealTime();
 
 void BM_TransportWriteThenQuery(benchmark::State& state) {
-    const std::string resource =
-        "TCPIP0::127.0.0.1::" + std::to_string(loopback().server->port(11)) + "::SOCKET";
-    auto bus = zp::makeTransportBus({{11, resource}}, nullptr);
-    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
-    std::string buffer;
-    for (auto _ : state) {
-        bus->writeText(d, ":SOUR:PULS:DEL1 1E-06\n");
-        bus->writeText(d, "*OPC?\n");
-        buffer.assign(2, ' ');
-        bus->readText(d, buffer);
-        if (bus->status() != 0) state.SkipWithError("bus error");
-    }
-    state.SetItemsProcessed(state.iterations());
+    transportRoundTrips(state, {":SOUR:PULS:DEL1 1E-06\n", "*OPC?\n"});
 }
 BENCHMARK(BM_TransportWriteThenQuery)->UseRealTime();
 
 void BM_TransportFourMebibyteReply(benchmark::State& state) {
-    const std::string resource =
-        "TCPIP0::127.0.0.1::" + std::to_string(loopback().server->port(11)) + "::SOCKET";
-    auto bus = zp::makeTransportBus({{11, resource}}, nullptr);
-    const auto d = bus->openDevice(0, 11, 0, 13, 1, 0);
+    LoopbackDevice device;
     std::string buffer;
     for (auto _ : state) {
-        bus->writeText(d, "BIG?\n");
+        device.bus->writeText(device.descriptor, "BIG?\n");
         buffer.assign(kBigSize + 16, ' ');
-        bus->readText(d, buffer);
-        if (bus->status() != 0 || buffer.size() != kBigSize || buffer.back() != '\n' ||
+        device.bus->readText(device.descriptor, buffer);
+        if (device.bus->status() != 0 || buffer.size() != kBigSize || buffer.back() != '\n' ||
             buffer.find_first_not_of('Z') != kBigSize - 1) {
             state.SkipWithError("reply damaged");
         }

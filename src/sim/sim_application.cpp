@@ -48,7 +48,7 @@ class SimCommandParserHandle final : public CommandParser, SimHandle {
 class SimMeasurementHandle final : public Measurement, SimHandle {
   public:
     SimMeasurementHandle(SimAnalyzerState& state, int channel, std::string name)
-        : SimHandle(state, "Measurement[" + std::to_string(channel) + ":" + name + "]"),
+        : SimHandle(state, objectName("Measurement", channel, name)),
           channel_(channel),
           name_(std::move(name)) {}
 

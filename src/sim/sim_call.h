@@ -59,6 +59,10 @@ namespace zp::sim {
 // The object name without its "[...]" part, as faults name it.
 std::string objectKind(std::string_view object);
 
+// "Kind[channel]" and "Kind[channel:name]", as objects are written in the trace.
+std::string objectName(std::string_view kind, int channel);
+std::string objectName(std::string_view kind, int channel, std::string_view name);
+
 template <class F>
 auto simCall(SimAnalyzerState& state, const std::string& object, std::string_view operation,
              const std::string& arguments, F&& body) -> decltype(body()) {

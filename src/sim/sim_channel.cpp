@@ -15,7 +15,7 @@ void require(bool ok, const char* description = kDataOutOfRange) {
 class SimChannelHandle final : public Channel, SimHandle {
   public:
     SimChannelHandle(SimAnalyzerState& state, int number)
-        : SimHandle(state, "Channel[" + std::to_string(number) + "]"), number_(number) {}
+        : SimHandle(state, objectName("Channel", number)), number_(number) {}
 
     int channelNumber() override {
         return call("channelNumber", "", [&] { return ch().number; });
@@ -27,50 +27,29 @@ class SimChannelHandle final : public Channel, SimHandle {
         call("endChannelSetup", "", [&] { ch().inSetup = false; });
     }
     void setIfBandwidth(double hz) override {
-        call("setIfBandwidth", args(hz), [&] {
-            auto& c = ch();
-            require(hz >= 1.0 && hz <= 15e6);
-            c.ifBandwidth = hz;
-        });
+        store("setIfBandwidth", hz, hz >= 1.0 && hz <= 15e6, [&] { return &ch().ifBandwidth; });
     }
 
     std::unique_ptr<IfConfiguration> ifConfiguration() override {
-        return call("ifConfiguration", "", [&] {
-            ch();
-            return makeSimIfConfiguration(state_, number_);
-        });
+        return subObject("ifConfiguration", makeSimIfConfiguration);
     }
     std::unique_ptr<PathConfiguration> pathConfiguration() override {
-        return call("pathConfiguration", "", [&] {
-            ch();
-            return makeSimPathConfiguration(state_, number_);
-        });
+        return subObject("pathConfiguration", makeSimPathConfiguration);
     }
     std::unique_ptr<InternalPulseGenerator> pulseGenerator() override {
-        return call("pulseGenerator", "", [&] {
-            ch();
-            return makeSimPulseGenerator(state_, number_);
-        });
+        return subObject("pulseGenerator", makeSimPulseGenerator);
     }
     std::unique_ptr<SignalProcessingModule> signalProcessingModule() override {
-        return call("signalProcessingModule", "", [&] {
-            ch();
-            return makeSimProcessingModule(state_, number_);
-        });
+        return subObject("signalProcessingModule", makeSimProcessingModule);
     }
     void setFrequencyOffsetState(int value) override {
-        call("setFrequencyOffsetState", args(value), [&] {
-            auto& c = ch();
-            require(value == 0 || value == 1);
-            c.frequencyOffsetState = value;
-        });
+        store("setFrequencyOffsetState", value, value == 0 || value == 1,
+              [&] { return &ch().frequencyOffsetState; });
     }
     void setFrequencyOffsetFrequency(double hz) override {
-        call("setFrequencyOffsetFrequency", args(hz), [&] {
-            auto& c = ch();
-            require(std::isfinite(hz) && std::abs(hz) <= state_.model().maxFrequency);
-            c.frequencyOffsetFrequency = hz;
-        });
+        store("setFrequencyOffsetFrequency", hz,
+              std::isfinite(hz) && std::abs(hz) <= state_.model().maxFrequency,
+              [&] { return &ch().frequencyOffsetFrequency; });
     }
     std::vector<std::string> getSupportedALCModes(int port) override {
         return call("getSupportedALCModes", args(port), [&] {
@@ -94,18 +73,12 @@ class SimChannelHandle final : public Channel, SimHandle {
         call("singleSweep", args(wait), [&] { state_.singleSweep(number_); });
     }
     void setSweepType(int type) override {
-        call("setSweepType", args(type), [&] {
-            auto& c = ch();
-            require(type >= 0 && type <= 4);
-            c.sweepType = type;
-        });
+        store("setSweepType", type, type >= 0 && type <= 4, [&] { return &ch().sweepType; });
     }
     void setCwFrequency(double hz) override {
-        call("setCwFrequency", args(hz), [&] {
-            auto& c = ch();
-            require(hz >= state_.model().minFrequency && hz <= state_.model().maxFrequency);
-            c.cwFrequency = hz;
-        });
+        store("setCwFrequency", hz,
+              hz >= state_.model().minFrequency && hz <= state_.model().maxFrequency,
+              [&] { return &ch().cwFrequency; });
     }
     void setNumberOfPoints(int points) override {
         call("setNumberOfPoints", args(points), [&] { state_.setPoints(ch(), points); });
@@ -129,6 +102,15 @@ class SimChannelHandle final : public Channel, SimHandle {
     }
 
   private:
+    template <class Object>
+    std::unique_ptr<Object> subObject(std::string_view operation,
+                                      std::unique_ptr<Object> (*make)(SimAnalyzerState&, int)) {
+        return call(operation, "", [&] {
+            ch();
+            return make(state_, number_);
+        });
+    }
+
     SimChannel& ch() { return state_.channel(number_); }
     int number_;
 };

@@ -52,6 +52,16 @@ double inRange(double value, double low, double high) {
     return value;
 }
 
+// "VOLTage" -> "VOLT".
+std::string shortForm(std::string_view mnemonic) {
+    std::string text;
+    for (char k : mnemonic) {
+        if (std::isupper(static_cast<unsigned char>(k)) == 0) break;
+        text += k;
+    }
+    return text;
+}
+
 // Picks the keyword that the parameter names and returns its short form (with its digit, as in
 // INT2), or fails with -224.
 std::string enumeration(const std::string& param,
@@ -68,12 +78,7 @@ std::string enumeration(const std::string& param,
         if (word.substr(wordDigits) != keyword.substr(keyDigits)) continue;
         const std::string_view mnemonic = keyword.substr(0, keyDigits);
         if (!matchesKeyword(std::string_view(word).substr(0, wordDigits), mnemonic)) continue;
-        std::string shortForm;
-        for (char k : mnemonic) {
-            if (std::isupper(static_cast<unsigned char>(k)) == 0) break;
-            shortForm += k;
-        }
-        return shortForm + std::string(keyword.substr(keyDigits));
+        return shortForm(mnemonic) + std::string(keyword.substr(keyDigits));
     }
     throw ScpiFailure{kIllegalParameterValue};
 }
@@ -87,6 +92,27 @@ void setting(Context& c, Get get, Set set) {
     } else {
         set(single(c));
     }
+}
+
+// A setting with two named states kept as a flag; a query answers the short form.
+void twoWay(Context& c, bool& flag, std::string_view whenSet, std::string_view whenClear) {
+    setting(
+        c, [&] { return shortForm(flag ? whenSet : whenClear); },
+        [&](const std::string& p) {
+            flag = enumeration(p, {whenSet, whenClear}) == shortForm(whenSet);
+        });
+}
+
+void numeric(Context& c, double& value, ScpiUnit unit, double low, double high) {
+    setting(
+        c, [&] { return formatNumber(value); },
+        [&](const std::string& p) { value = inRange(parseNumber(p, unit), low, high); });
+}
+
+void onOff(Context& c, bool& flag) {
+    setting(
+        c, [&] { return std::string(flag ? "1" : "0"); },
+        [&](const std::string& p) { flag = parseBoolean(p); });
 }
 
 void commandOnly(const Context& c) {
@@ -112,75 +138,39 @@ void systemError(Context& c) {
 }
 
 void outputPolarity(Context& c) {
-    setting(
-        c, [&] { return std::string(c.out().inverted ? "INV" : "NORM"); },
-        [&](const std::string& p) {
-            c.out().inverted = enumeration(p, {"NORMal", "INVerted"}) == "INV";
-        });
+    twoWay(c, c.out().inverted, "INVerted", "NORMal");
 }
 
 void outputImpedance(Context& c) {
-    setting(
-        c, [&] { return formatNumber(c.out().loadImpedance); },
-        [&](const std::string& p) {
-            c.out().loadImpedance =
-                inRange(parseNumber(p, ScpiUnit::ohm), kMinImpedance, kMaxImpedance);
-        });
+    numeric(c, c.out().loadImpedance, ScpiUnit::ohm, kMinImpedance, kMaxImpedance);
 }
 
 void outputState(Context& c) {
-    setting(
-        c, [&] { return std::string(c.out().on ? "1" : "0"); },
-        [&](const std::string& p) { c.out().on = parseBoolean(p); });
+    onOff(c, c.out().on);
 }
 
 void hold(Context& c) {
-    setting(
-        c, [&] { return std::string(c.state.holdVoltage ? "VOLT" : "CURR"); },
-        [&](const std::string& p) {
-            c.state.holdVoltage = enumeration(p, {"VOLTage", "CURRent"}) == "VOLT";
-        });
+    twoWay(c, c.state.holdVoltage, "VOLTage", "CURRent");
 }
 
 void levelHigh(Context& c) {
-    setting(
-        c, [&] { return formatNumber(c.out().high); },
-        [&](const std::string& p) {
-            c.out().high = inRange(parseNumber(p, ScpiUnit::volt), kMinLevel, kMaxLevel);
-        });
+    numeric(c, c.out().high, ScpiUnit::volt, kMinLevel, kMaxLevel);
 }
 
 void levelLow(Context& c) {
-    setting(
-        c, [&] { return formatNumber(c.out().low); },
-        [&](const std::string& p) {
-            c.out().low = inRange(parseNumber(p, ScpiUnit::volt), kMinLevel, kMaxLevel);
-        });
+    numeric(c, c.out().low, ScpiUnit::volt, kMinLevel, kMaxLevel);
 }
 
 void frequency(Context& c) {
-    setting(
-        c, [&] { return formatNumber(c.state.frequency); },
-        [&](const std::string& p) {
-            c.state.frequency =
-                inRange(parseNumber(p, ScpiUnit::hertz), kMinFrequency, kMaxFrequency);
-        });
+    numeric(c, c.state.frequency, ScpiUnit::hertz, kMinFrequency, kMaxFrequency);
 }
 
 void pulseWidth(Context& c) {
-    setting(
-        c, [&] { return formatNumber(c.out().width); },
-        [&](const std::string& p) {
-            c.out().width = inRange(parseNumber(p, ScpiUnit::second), 0.0, 1.0 / c.state.frequency);
-        });
+    numeric(c, c.out().width, ScpiUnit::second, 0.0, 1.0 / c.state.frequency);
 }
 
 void pulseDelay(Context& c) {
-    setting(
-        c, [&] { return formatNumber(c.out().delay); },
-        [&](const std::string& p) {
-            c.out().delay = inRange(parseNumber(p, ScpiUnit::second), 0.0, kMaxDelay);
-        });
+    numeric(c, c.out().delay, ScpiUnit::second, 0.0, kMaxDelay);
 }
 
 void triggerSource(Context& c) {
@@ -202,11 +192,7 @@ void armSource(Context& c) {
 }
 
 void referenceSource(Context& c) {
-    setting(
-        c, [&] { return std::string(c.state.externalReference ? "EXT" : "INT"); },
-        [&](const std::string& p) {
-            c.state.externalReference = enumeration(p, {"INTernal", "EXTernal"}) == "EXT";
-        });
+    twoWay(c, c.state.externalReference, "EXTernal", "INTernal");
 }
 
 void referenceFrequency(Context& c) {
@@ -221,9 +207,7 @@ void referenceFrequency(Context& c) {
 }
 
 void display(Context& c) {
-    setting(
-        c, [&] { return std::string(c.state.displayOn ? "1" : "0"); },
-        [&](const std::string& p) { c.state.displayOn = parseBoolean(p); });
+    onOff(c, c.state.displayOn);
 }
 
 // A pattern node: "[...]" is optional, a trailing "#" takes the output suffix 1 or 2.

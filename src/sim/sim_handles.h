@@ -20,6 +20,18 @@ class SimHandle {
         return simCall(state_, object_, operation, arguments, std::forward<F>(body));
     }
 
+    // Stores a checked value in the slot `find` points to. The slot is looked up first so that a
+    // missing channel is reported ahead of a bad value.
+    template <class Value, class Find>
+    void store(std::string_view operation, const Value& value, bool valid, Find&& find,
+               const char* refusal = kDataOutOfRange) {
+        call(operation, trace_text::args(value), [&] {
+            auto* slot = find();
+            if (!valid) throw analyzerError(refusal);
+            *slot = value;
+        });
+    }
+
     SimAnalyzerState& state_;
     std::string object_;
 };

@@ -17,10 +17,6 @@ void require(bool ok, const char* description = kDataOutOfRange) {
     if (!ok) throw analyzerError(description);
 }
 
-std::string objectName(const char* kind, int channel) {
-    return std::string(kind) + "[" + std::to_string(channel) + "]";
-}
-
 bool isReceiver(const std::string& name, int ports) {
     static const std::vector<std::string> two = {"A", "B", "R1", "R2"};
     static const std::vector<std::string> four = {"A", "B", "C", "D", "R1", "R2", "R3", "R4"};
@@ -80,32 +76,19 @@ class SimIfConfigurationHandle final : public IfConfiguration, SimHandle {
         call("setInternalGateSwitch", args(on), [&] { cfg().internalGateSwitch = on; });
     }
     void setIfTimeA(double seconds) override {
-        call("setIfTimeA", args(seconds), [&] {
-            auto& c = cfg();
-            require(seconds >= 0.0 && seconds <= 1.0);
-            c.ifTimeA = seconds;
-        });
+        store("setIfTimeA", seconds, seconds >= 0.0 && seconds <= 1.0,
+              [&] { return &cfg().ifTimeA; });
     }
     void setIfCountB(int count) override {
-        call("setIfCountB", args(count), [&] {
-            auto& c = cfg();
-            require(count >= 0);
-            c.ifCountB = count;
-        });
+        store("setIfCountB", count, count >= 0, [&] { return &cfg().ifCountB; });
     }
     void setNarrowbandSwitch(int onOff) override {
-        call("setNarrowbandSwitch", args(onOff), [&] {
-            auto& c = cfg();
-            require(onOff == 0 || onOff == 1);
-            c.narrowbandSwitch = onOff;
-        });
+        store("setNarrowbandSwitch", onOff, onOff == 0 || onOff == 1,
+              [&] { return &cfg().narrowbandSwitch; });
     }
     void setNarrowbandValue(double value) override {
-        call("setNarrowbandValue", args(value), [&] {
-            auto& c = cfg();
-            require(std::isfinite(value));
-            c.narrowbandValue = value;
-        });
+        store("setNarrowbandValue", value, std::isfinite(value),
+              [&] { return &cfg().narrowbandValue; });
     }
 
   private:
@@ -116,7 +99,7 @@ class SimIfConfigurationHandle final : public IfConfiguration, SimHandle {
 class SimPathElementHandle final : public PathElement, SimHandle {
   public:
     SimPathElementHandle(SimAnalyzerState& state, int channel, std::string name)
-        : SimHandle(state, "PathElement[" + std::to_string(channel) + ":" + name + "]"),
+        : SimHandle(state, objectName("PathElement", channel, name)),
           channel_(channel),
           name_(std::move(name)) {}
 
@@ -174,11 +157,8 @@ class SimPulseGeneratorHandle final : public InternalPulseGenerator, SimHandle {
         : SimHandle(state, objectName("PulseGenerator", channel)), channel_(channel) {}
 
     void setPeriod(double seconds) override {
-        call("setPeriod", args(seconds), [&] {
-            auto& p = pulse();
-            require(seconds > 0.0 && seconds <= 10.0);
-            p.period = seconds;
-        });
+        store("setPeriod", seconds, seconds > 0.0 && seconds <= 10.0,
+              [&] { return &pulse().period; });
     }
     double period() override {
         return call("period", "", [&] { return pulse().period; });
@@ -233,11 +213,9 @@ class SimProcessingModuleHandle final : public SignalProcessingModule, SimHandle
         : SimHandle(state, objectName("SignalProcessingModuleFour", channel)), channel_(channel) {}
 
     void setFilterType(const std::string& type) override {
-        call("setFilterType", args(type), [&] {
-            auto& m = module();
-            require(type == "RECT" || type == "PWIN", kIllegalValue);
-            m.filterType = type;
-        });
+        store(
+            "setFilterType", type, type == "RECT" || type == "PWIN",
+            [&] { return &module().filterType; }, kIllegalValue);
     }
     void setFilterParameter(const std::string& name, double value) override {
         call("setFilterParameter", args(name, value), [&] {
@@ -249,18 +227,12 @@ class SimProcessingModuleHandle final : public SignalProcessingModule, SimHandle
         });
     }
     void setProcessingSwitch(int onOff) override {
-        call("setProcessingSwitch", args(onOff), [&] {
-            auto& m = module();
-            require(onOff == 0 || onOff == 1);
-            m.processingSwitch = onOff;
-        });
+        store("setProcessingSwitch", onOff, onOff == 0 || onOff == 1,
+              [&] { return &module().processingSwitch; });
     }
     void setProcessingRate(double rate) override {
-        call("setProcessingRate", args(rate), [&] {
-            auto& m = module();
-            require(std::isfinite(rate));
-            m.processingRate = rate;
-        });
+        store("setProcessingRate", rate, std::isfinite(rate),
+              [&] { return &module().processingRate; });
     }
     void setCoefficientsA(const std::vector<std::int32_t>& values) override {
         call("setCoefficientsA", args(values), [&] { module().coefficientsA = values; });

@@ -23,8 +23,12 @@ class LinkFailure : public std::runtime_error {
     bool timedOut_;
 };
 
+// A link owns its connection, so links are never copied.
 class DeviceLink {
   public:
+    DeviceLink() = default;
+    DeviceLink(const DeviceLink&) = delete;
+    DeviceLink& operator=(const DeviceLink&) = delete;
     virtual ~DeviceLink() = default;
     // Sends the text unchanged. Throws LinkFailure.
     virtual void write(std::string_view text) = 0;

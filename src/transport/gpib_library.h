@@ -68,8 +68,6 @@ class GpibLink : public DeviceLink {
     // Throws InstrumentError when the board refuses the device.
     GpibLink(std::shared_ptr<GpibLibrary> library, const GpibResource& resource, int timeoutCode);
     ~GpibLink() override;
-    GpibLink(const GpibLink&) = delete;
-    GpibLink& operator=(const GpibLink&) = delete;
 
     void write(std::string_view text) override;
     std::string read(std::size_t maxChars) override;

@@ -18,8 +18,6 @@ class RawSocketLink : public DeviceLink {
     RawSocketLink(const std::string& host, int port, std::chrono::milliseconds ioTimeout,
                   std::chrono::milliseconds connectTimeout = std::chrono::seconds(5));
     ~RawSocketLink() override;
-    RawSocketLink(const RawSocketLink&) = delete;
-    RawSocketLink& operator=(const RawSocketLink&) = delete;
 
     void write(std::string_view text) override;
     // Waits until a line feed arrived or maxChars characters are buffered.

@@ -15,8 +15,6 @@ class Vxi11Link : public DeviceLink {
     Vxi11Link(const std::string& host, const std::string& device,
               std::chrono::milliseconds timeout);
     ~Vxi11Link() override;
-    Vxi11Link(const Vxi11Link&) = delete;
-    Vxi11Link& operator=(const Vxi11Link&) = delete;
 
     void write(std::string_view text) override;
     std::string read(std::size_t maxChars) override;
