@@ -1,6 +1,7 @@
 // zentra-pulse-cli: the main window without a screen. Runs the given actions in order.
 
 #include <iostream>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -13,24 +14,11 @@
 int main(int argc, char** argv) {
     using namespace zp::app;
     const std::vector<std::string> args(argv + 1, argv + argc);
-    ParsedCommandLine cmd = parseCommandLine(args, Program::Cli);
-    if (!cmd.error.empty()) {
-        std::cerr << "zentra-pulse-cli: " << cmd.error << "\nTry 'zentra-pulse-cli --help'.\n";
-        return kUsageExit;
+    const ParsedCommandLine cmd = parseCommandLine(args, Program::Cli);
+    if (const std::optional<int> status = earlyExit(cmd, Program::Cli, std::cout, std::cerr)) {
+        return *status;
     }
     const BenchOptions& options = cmd.options;
-    if (options.help) {
-        std::cout << usageText(Program::Cli);
-        return 0;
-    }
-    if (options.version) {
-        std::cout << versionText(Program::Cli);
-        return 0;
-    }
-    if (options.listModels) {
-        std::cout << modelListText();
-        return 0;
-    }
     if (cmd.rest.empty()) {
         std::cerr << "zentra-pulse-cli: no action given\nTry 'zentra-pulse-cli --help'.\n";
         return kUsageExit;
@@ -44,13 +32,9 @@ int main(int argc, char** argv) {
         return 1;
     }
 
-    std::unique_ptr<zp::sim::SimBench> bench;
-    try {
-        bench = makeBench(options);
-    } catch (const std::exception& e) {
-        std::cerr << "zentra-pulse-cli: " << e.what() << '\n';
-        return kUsageExit;
-    }
+    const std::unique_ptr<zp::sim::SimBench> bench =
+        makeBenchOrReport(options, Program::Cli, std::cerr);
+    if (!bench) return kUsageExit;
 
     ConsoleInteraction ui(std::cout, options.yes);
     zp::MainForm form(zp::pulsedModule(), *bench, ui);

@@ -6,6 +6,7 @@
 #include <QPixmap>
 #include <QTimer>
 #include <iostream>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -31,24 +32,11 @@ QStringList manualFolders() {
 int main(int argc, char** argv) {
     using namespace zp::app;
     const std::vector<std::string> args(argv + 1, argv + argc);
-    ParsedCommandLine cmd = parseCommandLine(args, Program::Gui);
-    if (!cmd.error.empty()) {
-        std::cerr << "zentra-pulse: " << cmd.error << "\nTry 'zentra-pulse --help'.\n";
-        return kUsageExit;
+    const ParsedCommandLine cmd = parseCommandLine(args, Program::Gui);
+    if (const std::optional<int> status = earlyExit(cmd, Program::Gui, std::cout, std::cerr)) {
+        return *status;
     }
     const BenchOptions& options = cmd.options;
-    if (options.help) {
-        std::cout << usageText(Program::Gui);
-        return 0;
-    }
-    if (options.version) {
-        std::cout << versionText(Program::Gui);
-        return 0;
-    }
-    if (options.listModels) {
-        std::cout << modelListText();
-        return 0;
-    }
 
     QApplication app(argc, argv);
     QApplication::setApplicationName(QStringLiteral("zentra-pulse"));
@@ -60,13 +48,9 @@ int main(int argc, char** argv) {
         return 0;
     }
 
-    std::unique_ptr<zp::sim::SimBench> bench;
-    try {
-        bench = makeBench(options);
-    } catch (const std::exception& e) {
-        std::cerr << "zentra-pulse: " << e.what() << '\n';
-        return kUsageExit;
-    }
+    const std::unique_ptr<zp::sim::SimBench> bench =
+        makeBenchOrReport(options, Program::Gui, std::cerr);
+    if (!bench) return kUsageExit;
 
     zp::ui::QtInteraction ui(manualFolders());
     ui.setUnattended(options.screenshot.has_value());

@@ -1,5 +1,6 @@
 #include "bench_options.h"
 
+#include <ostream>
 #include <sstream>
 #include <stdexcept>
 
@@ -7,10 +8,6 @@
 
 namespace zp::app {
 namespace {
-
-const char* programName(Program program) {
-    return program == Program::Gui ? "zentra-pulse" : "zentra-pulse-cli";
-}
 
 // "--name=value" or "--name value"; nothing when `arg` is not this option.
 struct ValueOption {
@@ -44,6 +41,10 @@ std::string checkAnalyzer(const std::string& value, std::string& model) {
 }
 
 }  // namespace
+
+const char* programName(Program program) {
+    return program == Program::Gui ? "zentra-pulse" : "zentra-pulse-cli";
+}
 
 ParsedCommandLine parseCommandLine(const std::vector<std::string>& args, Program program) {
     ParsedCommandLine result;
@@ -138,7 +139,7 @@ ParsedCommandLine parseCommandLine(const std::vector<std::string>& args, Program
 
 std::unique_ptr<sim::SimBench> makeBench(const BenchOptions& options) {
     sim::SimFaults faults;
-    for (const std::string& spec : options.faults) faults.add(spec);
+    for (const std::string& fault : options.faults) faults.add(fault);
     auto bench = std::make_unique<sim::SimBench>(options.model, std::move(faults));
     if (options.traceFile) bench->trace()->openFile(*options.traceFile);
     if (options.bus) {
@@ -148,6 +149,36 @@ std::unique_ptr<sim::SimBench> makeBench(const BenchOptions& options) {
                              "generators on " + *options.bus);
     }
     return bench;
+}
+
+std::unique_ptr<sim::SimBench> makeBenchOrReport(const BenchOptions& options, Program program,
+                                                 std::ostream& err) {
+    try {
+        return makeBench(options);
+    } catch (const std::exception& e) {
+        err << programName(program) << ": " << e.what() << '\n';
+        return nullptr;
+    }
+}
+
+std::optional<int> earlyExit(const ParsedCommandLine& cmd, Program program, std::ostream& out,
+                             std::ostream& err) {
+    if (!cmd.error.empty()) {
+        err << programName(program) << ": " << cmd.error << "\nTry '" << programName(program)
+            << " --help'.\n";
+        return kUsageExit;
+    }
+    const BenchOptions& options = cmd.options;
+    if (options.help) {
+        out << usageText(program);
+    } else if (options.version) {
+        out << versionText(program);
+    } else if (options.listModels) {
+        out << modelListText();
+    } else {
+        return std::nullopt;
+    }
+    return 0;
 }
 
 std::string usageText(Program program) {
@@ -164,7 +195,7 @@ std::string usageText(Program program) {
            "  --bus RESOURCES       pulse generator transport: sim (default) or\n"
            "                        ADDR=RESOURCE,... e.g. 11=TCPIP0::127.0.0.1::5025::SOCKET\n"
            "  --trace-io FILE       write every analyzer call and bus text to FILE\n"
-           "  --fault SPEC          make the simulated bench fail (repeatable): analyzer:OP=TEXT,\n"
+           "  --fault FAULT         make the simulated bench fail (repeatable): analyzer:OP=TEXT,\n"
            "                        noidn:ADDR, generror:ADDR=ENTRY, timeout:ADDR, baddata\n";
     if (cli) out << "  --yes, -y             answer yes to every question\n";
     out << "  --help, -h            show this help and exit\n"

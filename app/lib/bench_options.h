@@ -2,6 +2,7 @@
 // Command-line options shared by zentra-pulse and zentra-pulse-cli: which bench to run on, the
 // generator transport, faults to inject and the I/O trace.
 
+#include <iosfwd>
 #include <memory>
 #include <optional>
 #include <string>
@@ -42,6 +43,18 @@ ParsedCommandLine parseCommandLine(const std::vector<std::string>& args, Program
 // generator transport and the trace file. Throws std::invalid_argument / std::runtime_error.
 std::unique_ptr<sim::SimBench> makeBench(const BenchOptions& options);
 
+// Builds the bench, or reports why it cannot on `err` (prefixed with the program's name) and
+// returns nothing; the program then ends with kUsageExit.
+std::unique_ptr<sim::SimBench> makeBenchOrReport(const BenchOptions& options, Program program,
+                                                 std::ostream& err);
+
+// What the command line settles before anything starts: an unusable one is reported on `err`
+// (exit status kUsageExit); --help, --version and --list-models write their text to `out`
+// (exit status 0). Nothing when the program goes on.
+std::optional<int> earlyExit(const ParsedCommandLine& cmd, Program program, std::ostream& out,
+                             std::ostream& err);
+
+const char* programName(Program program);
 std::string usageText(Program program);
 std::string versionText(Program program);
 // One line per simulated model: name, model text, options, ports, sources.

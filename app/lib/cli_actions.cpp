@@ -2,6 +2,7 @@
 
 #include <charconv>
 #include <sstream>
+#include <utility>
 
 #include "core/numeric.h"
 #include "forms/main_form_json.h"
@@ -190,38 +191,37 @@ Action parseStep(WordCursor& words) {
     return a;
 }
 
-Action parseCalculate(WordCursor&) {
+// An action that takes no words of its own.
+Action plainAction(std::string words, std::function<std::string(ActionContext&)> run) {
     Action a;
-    a.words = "calculate";
-    a.run = [](ActionContext& ctx) {
+    a.words = std::move(words);
+    a.run = std::move(run);
+    return a;
+}
+
+Action parseCalculate(WordCursor&) {
+    return plainAction("calculate", [](ActionContext& ctx) {
         ctx.form.b_calculate_Click();
         return "calculate -> PRF " + baseText(ctx.form.VexoEdit_prf) + ", IF bandwidth " +
                baseText(ctx.form.VexoEdit_IFBW) +
                (isTrue(ctx.form.state().NeedsCalculation) ? " (not solved)" : "");
-    };
-    return a;
+    });
 }
 
 Action parseShow(WordCursor&) {
-    Action a;
-    a.words = "show";
-    a.run = [](ActionContext& ctx) {
+    return plainAction("show", [](ActionContext& ctx) {
         ctx.out << mainFormJson(ctx.form) << '\n';
         return std::string();
-    };
-    return a;
+    });
 }
 
 Action parseHelp(WordCursor&) {
-    Action a;
-    a.words = "help";
-    a.run = [](ActionContext& ctx) {
+    return plainAction("help", [](ActionContext& ctx) {
         ctx.form.m_contents_Click();
         std::optional<ConsoleInteraction::HelpRequest> request = ctx.ui.takeHelpRequest();
         if (!request) throw ActionError("the analyzer did not name a help file");
         return "help -> " + request->file + " (topic " + std::to_string(request->topic) + ")";
-    };
-    return a;
+    });
 }
 
 }  // namespace
@@ -231,8 +231,8 @@ const std::string& WordCursor::next(const std::string& action, const std::string
     return words_[pos_++];
 }
 
-const std::vector<ActionSpec>& actionTable() {
-    static const std::vector<ActionSpec> kTable = {
+const std::vector<ActionKind>& actionTable() {
+    static const std::vector<ActionKind> kTable = {
         {"set", "set FIELD [ROW] VALUE | set TOGGLE on|off", parseSet},
         {"step", "step FIELD [ROW] up|down", parseStep},
         {"calculate", "calculate", parseCalculate},
@@ -247,16 +247,16 @@ std::vector<Action> parseActions(const std::vector<std::string>& words) {
     WordCursor cursor(words);
     while (!cursor.atEnd()) {
         const std::string& name = cursor.next("", "action");
-        const ActionSpec* spec = nullptr;
-        for (const ActionSpec& s : actionTable()) {
-            if (s.name == name) spec = &s;
+        const ActionKind* kind = nullptr;
+        for (const ActionKind& k : actionTable()) {
+            if (k.name == name) kind = &k;
         }
-        if (spec == nullptr) {
+        if (kind == nullptr) {
             std::string known;
-            for (const ActionSpec& s : actionTable()) known += (known.empty() ? "" : ", ") + s.name;
+            for (const ActionKind& k : actionTable()) known += (known.empty() ? "" : ", ") + k.name;
             throw ActionError("unknown action '" + name + "' (actions: " + known + ")");
         }
-        actions.push_back(spec->parse(cursor));
+        actions.push_back(kind->parse(cursor));
     }
     return actions;
 }

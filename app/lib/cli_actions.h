@@ -49,13 +49,13 @@ class WordCursor {
     std::size_t pos_ = 0;
 };
 
-struct ActionSpec {
+struct ActionKind {
     std::string name;
     std::string usage;
     std::function<Action(WordCursor&)> parse;  // the action's name has been taken already
 };
 
-const std::vector<ActionSpec>& actionTable();
+const std::vector<ActionKind>& actionTable();
 
 // Parses every action before any runs, so that a typing error costs nothing.
 std::vector<Action> parseActions(const std::vector<std::string>& words);

@@ -20,26 +20,17 @@ constexpr const char* kFourPortCaptions[] = {
     "A IF Gate :", "B IF Gate :", "C IF Gate :", "D IF Gate :"};
 constexpr const char* kSixthRowCaption = "R IF Gate :";
 
-Control makeControl(std::string name, std::string caption, Geometry g = {}) {
-    Control c;
+template <typename C = Control>
+C makeControl(std::string name, std::string caption, Geometry g = {}) {
+    C c;
     c.name = std::move(name);
     c.caption = std::move(caption);
     c.geometry = g;
     return c;
 }
 
-MenuEntry makeMenu(std::string name, std::string caption) {
-    MenuEntry m;
-    m.name = std::move(name);
-    m.caption = std::move(caption);
-    return m;
-}
-
 CheckBox makeCheckBox(std::string name, std::string caption, Geometry g, Check16 value) {
-    CheckBox c;
-    c.name = std::move(name);
-    c.caption = std::move(caption);
-    c.geometry = g;
+    CheckBox c = makeControl<CheckBox>(std::move(name), std::move(caption), g);
     c.value = value;
     return c;
 }
@@ -118,18 +109,26 @@ void MainForm::buildControls() {
     b_min = button("b_min", "Minimize", 3);
     b_close = button("b_close", "Close", 4);
 
-    m_Config = makeMenu("m_Config", "&Configure");
-    m_ConfigPG = makeMenu("m_ConfigPG", "&Pulse Generators/Modulators...");
-    m_ConfigRx = makeMenu("m_ConfigRx", "&Receiver Gains...");
-    m_ConverterMeas = makeMenu("m_ConverterMeas", "&Converter Measurements");
-    m_NoPG = makeMenu("m_NoPG", "No Pulse &Generators");
-    m_NoSWGating = makeMenu("m_NoSWGating", "No &SW Gating");
-    m_View = makeMenu("m_View", "&View");
-    m_PulseProfile = makeMenu("m_PulseProfile", "&Pulse Profile...");
-    m_PulseConfig = makeMenu("m_PulseConfig", "Pulse &Configuration...");
-    m_help = makeMenu("m_help", "&Help");
-    m_contents = makeMenu("m_contents", "&Contents...");
-    m_about = makeMenu("m_about", "&About...");
+    struct MenuRow {
+        MenuEntry MainForm::*entry;
+        const char* name;
+        const char* caption;
+    };
+    static constexpr MenuRow kMenus[] = {
+        {&MainForm::m_Config, "m_Config", "&Configure"},
+        {&MainForm::m_ConfigPG, "m_ConfigPG", "&Pulse Generators/Modulators..."},
+        {&MainForm::m_ConfigRx, "m_ConfigRx", "&Receiver Gains..."},
+        {&MainForm::m_ConverterMeas, "m_ConverterMeas", "&Converter Measurements"},
+        {&MainForm::m_NoPG, "m_NoPG", "No Pulse &Generators"},
+        {&MainForm::m_NoSWGating, "m_NoSWGating", "No &SW Gating"},
+        {&MainForm::m_View, "m_View", "&View"},
+        {&MainForm::m_PulseProfile, "m_PulseProfile", "&Pulse Profile..."},
+        {&MainForm::m_PulseConfig, "m_PulseConfig", "Pulse &Configuration..."},
+        {&MainForm::m_help, "m_help", "&Help"},
+        {&MainForm::m_contents, "m_contents", "&Contents..."},
+        {&MainForm::m_about, "m_about", "&About..."},
+    };
+    for (const MenuRow& m : kMenus) this->*m.entry = makeControl<MenuEntry>(m.name, m.caption);
 
     fieldGeometry[VexoEdit_prf.name()] = kPrfField;
     fieldGeometry[VexoEdit_pri.name()] = kPriField;

@@ -112,6 +112,9 @@ class MainForm {
     void layOutRows(const PulsedModule& filled);
     void runPrfRule(bool fromStep);
     void pullBackDelay(EntryField& delay, double prf);
+    // The tail of the width and delay rules: the changed row's value goes to the rows sharing
+    // its output, the profile is disabled and the setup invalidated.
+    void shareRowChange(std::vector<EntryField>& column, int row);
     void calculateSolution(double desiredPrf);
     void showResults(double desiredPrf);
     // Rows the timing rules look at: NumOutputs, never more than the window has.

@@ -1,5 +1,6 @@
 #include "forms/main_form_json.h"
 
+#include <string_view>
 #include <variant>
 
 #include "forms/json_writer.h"
@@ -9,71 +10,53 @@ namespace zp {
 
 namespace {
 
+// One "name": value member.
+template <typename T>
+void member(JsonWriter& w, std::string_view name, const T& v) {
+    w.key(name);
+    w.value(v);
+}
+
 void geometry(JsonWriter& w, const Geometry& g) {
-    w.key("left");
-    w.value(g.left);
-    w.key("top");
-    w.value(g.top);
-    w.key("width");
-    w.value(g.width);
-    w.key("height");
-    w.value(g.height);
+    member(w, "left", g.left);
+    member(w, "top", g.top);
+    member(w, "width", g.width);
+    member(w, "height", g.height);
+}
+
+// The members every control shares, then its own ones, then where it sits.
+template <typename Extra>
+void controlObject(JsonWriter& w, const Control& c, Extra extra, bool withGeometry = true) {
+    w.key(c.name);
+    w.beginObject();
+    member(w, "caption", c.caption);
+    extra();
+    member(w, "enabled", c.enabled);
+    member(w, "visible", c.visible);
+    if (withGeometry) geometry(w, c.geometry);
+    w.endObject();
 }
 
 void control(JsonWriter& w, const Control& c) {
-    w.key(c.name);
-    w.beginObject();
-    w.key("caption");
-    w.value(c.caption);
-    w.key("enabled");
-    w.value(c.enabled);
-    w.key("visible");
-    w.value(c.visible);
-    geometry(w, c.geometry);
-    w.endObject();
+    controlObject(w, c, [] {});
 }
 
 void checkBox(JsonWriter& w, const CheckBox& c) {
-    w.key(c.name);
-    w.beginObject();
-    w.key("caption");
-    w.value(c.caption);
-    w.key("value");
-    w.value(static_cast<int>(c.value));
-    w.key("enabled");
-    w.value(c.enabled);
-    w.key("visible");
-    w.value(c.visible);
-    geometry(w, c.geometry);
-    w.endObject();
+    controlObject(w, c, [&] { member(w, "value", static_cast<int>(c.value)); });
 }
 
 void menu(JsonWriter& w, const MenuEntry& m) {
-    w.key(m.name);
-    w.beginObject();
-    w.key("caption");
-    w.value(m.caption);
-    w.key("checked");
-    w.value(m.checked);
-    w.key("enabled");
-    w.value(m.enabled);
-    w.key("visible");
-    w.value(m.visible);
-    w.endObject();
+    controlObject(
+        w, m, [&] { member(w, "checked", m.checked); }, false);
 }
 
 void fieldBody(JsonWriter& w, const EntryField& f) {
     w.beginObject();
-    w.key("value");
-    w.value(f.value());
-    w.key("enabled");
-    w.value(f.enabled());
-    w.key("text");
-    w.value(f.displayText());
-    w.key("lower");
-    w.value(f.lower());
-    w.key("upper");
-    w.value(f.upper());
+    member(w, "value", f.value());
+    member(w, "enabled", f.enabled());
+    member(w, "text", f.displayText());
+    member(w, "lower", f.lower());
+    member(w, "upper", f.upper());
     w.endObject();
 }
 
@@ -90,19 +73,16 @@ void rowFields(JsonWriter& w, const char* name, const std::vector<EntryField>& r
 }
 
 void flag(JsonWriter& w, const char* name, Bool16 v) {
-    w.key(name);
-    w.value(isTrue(v));
+    member(w, name, isTrue(v));
 }
 
 void number(JsonWriter& w, const char* name, double v) {
-    w.key(name);
-    w.value(v);
+    member(w, name, v);
 }
 
 template <typename Int>
 void whole(JsonWriter& w, const char* name, Int v) {
-    w.key(name);
-    w.value(static_cast<std::int64_t>(v));
+    member(w, name, static_cast<std::int64_t>(v));
 }
 
 template <typename T>
@@ -203,12 +183,9 @@ std::string mainFormJson(const MainForm& f) {
     w.beginObject();
     w.key(f.f_PulsedZentra.name);
     w.beginObject();
-    w.key("caption");
-    w.value(f.f_PulsedZentra.caption);
-    w.key("width");
-    w.value(f.f_PulsedZentra.geometry.width);
-    w.key("height");
-    w.value(f.f_PulsedZentra.geometry.height);
+    member(w, "caption", f.f_PulsedZentra.caption);
+    member(w, "width", f.f_PulsedZentra.geometry.width);
+    member(w, "height", f.f_PulsedZentra.geometry.height);
     w.endObject();
 
     control(w, f.frm_PulsedParams);

@@ -129,16 +129,8 @@ void MainForm::ifbwRule() {
 
 void MainForm::widthRule(int row) {
     checkRow(row, ruleRows());
-    EntryField& changed = VexoEdit_width[row];
-    SNormalizeValue(changed);
-    const bool external = state_.UseInternalPG == kUnchecked;
-    for (int i : sharedRows(row)) {
-        if (external && VexoEdit_width[i].value() == changed.value()) continue;
-        VexoEdit_width[i].setValue(changed.value());
-    }
-    b_PulseProfile.enabled = false;
-    m_PulseProfile.enabled = false;
-    if (!m_NoSWGating.checked) Invalidate();
+    SNormalizeValue(VexoEdit_width[row]);
+    shareRowChange(VexoEdit_width, row);
 }
 
 void MainForm::delayRule(int row) {
@@ -146,10 +138,16 @@ void MainForm::delayRule(int row) {
     EntryField& changed = VexoEdit_delay[row];
     SNormalizeValue(changed);
     pullBackDelay(changed, VexoEdit_prf.value());
+    shareRowChange(VexoEdit_delay, row);
+}
+
+void MainForm::shareRowChange(std::vector<EntryField>& column, int row) {
+    const double value = column[row].value();
+    // With external generators a row already holding the value is left alone.
     const bool external = state_.UseInternalPG == kUnchecked;
     for (int i : sharedRows(row)) {
-        if (external && VexoEdit_delay[i].value() == changed.value()) continue;
-        VexoEdit_delay[i].setValue(changed.value());
+        if (external && column[i].value() == value) continue;
+        column[i].setValue(value);
     }
     b_PulseProfile.enabled = false;
     m_PulseProfile.enabled = false;

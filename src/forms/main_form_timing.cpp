@@ -1,6 +1,7 @@
 // The timing rules of the main window, the duty-cycle summary and Calculate.
 
 #include <cmath>
+#include <functional>
 #include <stdexcept>
 
 #include "core/numeric.h"
@@ -19,44 +20,36 @@ constexpr double kConverterDelay = 6.2e-6;
 constexpr double kClock100MHz = 100000000.0;
 constexpr double kClock60MHz = 60000000.0;
 
+// The value of rows [first, end) that `better` prefers. The first row counts even when its field
+// is disabled; later rows only when enabled.
+template <typename Better>
+double extremeOfRows(const std::vector<EntryField>& rows, int first, int end, Better better) {
+    double best = rows.at(first).value();
+    for (int row = first + 1; row < end; ++row) {
+        const EntryField& f = rows[row];
+        if (f.enabled() && better(f.value(), best)) best = f.value();
+    }
+    return best;
+}
+
 }  // namespace
 
-// ---- Timing rules. The first row of each scan counts even when its field is disabled.
+// ---- Timing rules.
 
 double MainForm::FMaxPulseWidth() const {
-    double widest = VexoEdit_width.at(0).value();
-    for (int row = 1; row < ruleRows(); ++row) {
-        const EntryField& f = VexoEdit_width[row];
-        if (f.enabled() && f.value() > widest) widest = f.value();
-    }
-    return widest;
+    return extremeOfRows(VexoEdit_width, 0, ruleRows(), std::greater<>());
 }
 
 double MainForm::FMaxGateWidth() const {
-    double widest = VexoEdit_width.at(1).value();
-    for (int row = 2; row < ruleRows(); ++row) {
-        const EntryField& f = VexoEdit_width[row];
-        if (f.enabled() && f.value() > widest) widest = f.value();
-    }
-    return widest;
+    return extremeOfRows(VexoEdit_width, 1, ruleRows(), std::greater<>());
 }
 
 double MainForm::FMinPulseWidth() const {
-    double narrowest = VexoEdit_width.at(0).value();
-    for (int row = 1; row < ruleRows(); ++row) {
-        const EntryField& f = VexoEdit_width[row];
-        if (f.enabled() && f.value() < narrowest) narrowest = f.value();
-    }
-    return narrowest;
+    return extremeOfRows(VexoEdit_width, 0, ruleRows(), std::less<>());
 }
 
 double MainForm::FHighestGateDelay() const {
-    double highest = VexoEdit_delay.at(1).value();
-    for (int row = 2; row < ruleRows(); ++row) {
-        const EntryField& f = VexoEdit_delay[row];
-        if (f.enabled() && f.value() > highest) highest = f.value();
-    }
-    return highest;
+    return extremeOfRows(VexoEdit_delay, 1, ruleRows(), std::greater<>());
 }
 
 bool MainForm::FPulseWidthOK(double prf) {

@@ -188,6 +188,30 @@ QPushButton* MainWindow::makeButton(const Control& c) {
     return button;
 }
 
+QGroupBox* MainWindow::makeFrame(const Control& c) {
+    auto* frame = new QGroupBox(text(c.caption));
+    frame->setObjectName(text(c.name));
+    refreshers_.push_back([frame, &c] {
+        frame->setTitle(text(c.caption));
+        applyControl(frame, c);
+    });
+    return frame;
+}
+
+QCheckBox* MainWindow::makeCheckBox(const CheckBox& c, std::function<void(bool)> onClick) {
+    auto* box = new QCheckBox(text(c.caption));
+    box->setObjectName(text(c.name));
+    connect(box, &QCheckBox::clicked, this, [this, onClick = std::move(onClick)](bool checked) {
+        run([&onClick, checked] { onClick(checked); });
+    });
+    refreshers_.push_back([box, &c] {
+        box->setText(text(c.caption));
+        box->setChecked(c.checked());
+        applyControl(box, c);
+    });
+    return box;
+}
+
 NumericEntry* MainWindow::makeEntry(EntryField& field) {
     auto* entry = new NumericEntry(field);
     entry->setMinimumWidth(px(zp::layout::kFieldWidth));
@@ -205,12 +229,7 @@ QWidget* MainWindow::buildCentral() {
     auto* column = new QVBoxLayout(central);
 
     // Desired PRF and IFBW.
-    auto* params = new QGroupBox(text(form_.frm_PulsedParams.caption));
-    params->setObjectName(text(form_.frm_PulsedParams.name));
-    refreshers_.push_back([params, this] {
-        params->setTitle(text(form_.frm_PulsedParams.caption));
-        applyControl(params, form_.frm_PulsedParams);
-    });
+    QGroupBox* params = makeFrame(form_.frm_PulsedParams);
     auto* paramsGrid = new QGridLayout(params);
     EntryField* fields[] = {&form_.VexoEdit_prf, &form_.VexoEdit_pri, &form_.VexoEdit_IFBW};
     const Control* labels[] = {&form_.lbl_prf, &form_.lbl_pri, &form_.lbl_ifbw};
@@ -222,26 +241,14 @@ QWidget* MainWindow::buildCentral() {
         paramsGrid->addWidget(label, i, 0);
         paramsGrid->addWidget(entry, i, 1);
     }
-    auto* fixedPrf = new QCheckBox(text(form_.chk_FixedPRF.caption));
-    fixedPrf->setObjectName(text(form_.chk_FixedPRF.name));
-    connect(fixedPrf, &QCheckBox::clicked, this,
-            [this](bool checked) { run([this, checked] { form_.setFixedPRF(checked); }); });
-    refreshers_.push_back([fixedPrf, this] {
-        fixedPrf->setText(text(form_.chk_FixedPRF.caption));
-        fixedPrf->setChecked(form_.chk_FixedPRF.checked());
-        applyControl(fixedPrf, form_.chk_FixedPRF);
-    });
+    QCheckBox* fixedPrf =
+        makeCheckBox(form_.chk_FixedPRF, [this](bool checked) { form_.setFixedPRF(checked); });
     paramsGrid->addWidget(fixedPrf, 0, 2);
     paramsGrid->setColumnStretch(1, 1);
     column->addWidget(params);
 
     // Modulation/Gates: a heading line and one line per row.
-    gatesFrame_ = new QGroupBox(text(form_.frm_gates.caption));
-    gatesFrame_->setObjectName(text(form_.frm_gates.name));
-    refreshers_.push_back([this] {
-        gatesFrame_->setTitle(text(form_.frm_gates.caption));
-        applyControl(gatesFrame_, form_.frm_gates);
-    });
+    gatesFrame_ = makeFrame(form_.frm_gates);
     gatesGrid_ = new QGridLayout(gatesFrame_);
     QLabel* widthHeading = makeLabel(form_.lbl_width);
     QLabel* delayHeading = makeLabel(form_.lbl_delay);
@@ -256,12 +263,7 @@ QWidget* MainWindow::buildCentral() {
 
     // Duty cycle and the Calculate/Apply frame side by side.
     auto* lower = new QHBoxLayout;
-    auto* duty = new QGroupBox(text(form_.frm_DutyCycle.caption));
-    duty->setObjectName(text(form_.frm_DutyCycle.name));
-    refreshers_.push_back([duty, this] {
-        duty->setTitle(text(form_.frm_DutyCycle.caption));
-        applyControl(duty, form_.frm_DutyCycle);
-    });
+    QGroupBox* duty = makeFrame(form_.frm_DutyCycle);
     auto* dutyLayout = new QVBoxLayout(duty);
     QLabel* dutyText = makeLabel(form_.lbl_DutyCycle);
     dutyText->setAlignment(Qt::AlignLeft | Qt::AlignTop);
@@ -270,29 +272,15 @@ QWidget* MainWindow::buildCentral() {
     dutyLayout->addWidget(dutyText);
     lower->addWidget(duty, 1);
 
-    auto* pulsed = new QGroupBox(text(form_.frm_pulsed.caption));
-    pulsed->setObjectName(text(form_.frm_pulsed.name));
-    refreshers_.push_back([pulsed, this] {
-        pulsed->setTitle(text(form_.frm_pulsed.caption));
-        applyControl(pulsed, form_.frm_pulsed);
-    });
+    QGroupBox* pulsed = makeFrame(form_.frm_pulsed);
     auto* pulsedGrid = new QGridLayout(pulsed);
     QPushButton* calculate = makeButton(form_.b_calculate);
     calculate->setDefault(false);
     pulsedGrid->addWidget(calculate, 0, 0);
     pulsedGrid->addWidget(makeButton(form_.b_apply), 0, 1);
-    auto* pulsedBox = new QCheckBox(text(form_.chk_pulsed.caption));
-    pulsedBox->setObjectName(text(form_.chk_pulsed.name));
-    connect(pulsedBox, &QCheckBox::clicked, this, [this](bool checked) {
-        run([this, checked] {
-            form_.chk_pulsed.value = checked ? kChecked : kUnchecked;
-            form_.chk_pulsed_Click();
-        });
-    });
-    refreshers_.push_back([pulsedBox, this] {
-        pulsedBox->setText(text(form_.chk_pulsed.caption));
-        pulsedBox->setChecked(form_.chk_pulsed.checked());
-        applyControl(pulsedBox, form_.chk_pulsed);
+    QCheckBox* pulsedBox = makeCheckBox(form_.chk_pulsed, [this](bool checked) {
+        form_.chk_pulsed.value = checked ? kChecked : kUnchecked;
+        form_.chk_pulsed_Click();
     });
     pulsedGrid->addWidget(pulsedBox, 1, 0, 1, 2);
     pulsedGrid->setRowStretch(2, 1);

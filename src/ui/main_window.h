@@ -57,6 +57,9 @@ class MainWindow : public QMainWindow {
     void buildRows();
     QPushButton* makeButton(const Control& c);
     QLabel* makeLabel(const Control& c);
+    QGroupBox* makeFrame(const Control& c);
+    // A check box whose click runs `onClick` with the new state as a model handler.
+    QCheckBox* makeCheckBox(const CheckBox& c, std::function<void(bool)> onClick);
     NumericEntry* makeEntry(EntryField& field);
     QAction* makeAction(QMenu* menu, const MenuEntry& entry, bool checkable);
     void notAvailable(const Control& c);

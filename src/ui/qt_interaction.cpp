@@ -67,19 +67,20 @@ bool QtInteraction::ask(const std::string& text) {
 }
 
 std::optional<std::string> QtInteraction::chooseOpenFile(const std::string& filter) {
-    if (unattended_) return std::nullopt;
-    const QString file =
-        QFileDialog::getOpenFileName(window_, QString::fromUtf8(kAppTitle),
-                                     QCoreApplication::applicationDirPath(), qtFileFilter(filter));
-    if (file.isEmpty()) return std::nullopt;
-    return file.toStdString();
+    return chooseFile(filter, FileDialog::Open);
 }
 
 std::optional<std::string> QtInteraction::chooseSaveFile(const std::string& filter) {
+    return chooseFile(filter, FileDialog::Save);
+}
+
+std::optional<std::string> QtInteraction::chooseFile(const std::string& filter, FileDialog kind) {
     if (unattended_) return std::nullopt;
+    const auto choose =
+        kind == FileDialog::Open ? &QFileDialog::getOpenFileName : &QFileDialog::getSaveFileName;
     const QString file =
-        QFileDialog::getSaveFileName(window_, QString::fromUtf8(kAppTitle),
-                                     QCoreApplication::applicationDirPath(), qtFileFilter(filter));
+        choose(window_, QString::fromUtf8(kAppTitle), QCoreApplication::applicationDirPath(),
+               qtFileFilter(filter), nullptr, QFileDialog::Options());
     if (file.isEmpty()) return std::nullopt;
     return file.toStdString();
 }

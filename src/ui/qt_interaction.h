@@ -41,6 +41,9 @@ class QtInteraction : public Interaction {
     HelpViewer* helpViewer() const { return helpViewer_.get(); }
 
   private:
+    enum class FileDialog { Open, Save };
+    std::optional<std::string> chooseFile(const std::string& filter, FileDialog kind);
+
     QStringList manualFolders_;
     QPointer<QWidget> window_;
     bool unattended_ = false;

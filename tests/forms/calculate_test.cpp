@@ -13,76 +13,70 @@ constexpr const char* kNoSolution =
     "No solution found.\nFor more information, see \"Pulsed Application\" in Veltrix Zentra "
     "online help.";
 
-using Calculate = FormTest;
-
-void typePrf(MainForm& form, double prf) {
-    ASSERT_EQ(form.VexoEdit_prf.enter(prf), std::nullopt);
-}
-
-// ---- The 90 % width limit.
+class Calculate : public FormTest {
+  protected:
+    // Sets the width (and delay) of a row from code; a negative delay leaves it alone.
+    void row(int r, double width, double delay = -1, bool enabled = true) {
+        form.VexoEdit_width[r].setValue(width);
+        form.VexoEdit_width[r].setEnabled(enabled);
+        if (delay < 0) return;
+        form.VexoEdit_delay[r].setValue(delay);
+        form.VexoEdit_delay[r].setEnabled(enabled);
+    }
+    // Calculate must have failed and left the state unsolved.
+    void expectUnsolved(const std::vector<std::string>& messages) {
+        EXPECT_EQ(ui.messages, messages);
+        EXPECT_TRUE(isTrue(state.NeedsCalculation));
+        EXPECT_FALSE(form.b_apply.enabled);
+    }
+};
 
 TEST_F(Calculate, WidthLimitIsStrict) {
-    typePrf(form, 100000);
-    form.VexoEdit_width[0].setValue(8e-6);
+    typePrf(100000);
+    row(0, 8e-6);
     EXPECT_TRUE(form.FPulseWidthOK(100000));
-    form.VexoEdit_width[0].setValue(9e-6);
+    row(2, 20e-6, -1, false);  // a disabled gate does not count...
+    EXPECT_TRUE(form.FPulseWidthOK(100000));
+    EXPECT_TRUE(ui.messages.empty());
+    row(0, 9e-6, -1, false);  // ...but row 0 always does
     EXPECT_FALSE(form.FPulseWidthOK(100000));
     EXPECT_EQ(ui.messages, std::vector<std::string>{kWidthLimit});
-}
-
-TEST_F(Calculate, DisabledGateDoesNotCountButRowZeroAlwaysDoes) {
-    typePrf(form, 100000);
-    form.VexoEdit_width[2].setValue(20e-6);
-    form.VexoEdit_width[2].setEnabled(false);
-    EXPECT_TRUE(form.FPulseWidthOK(100000));
-    form.VexoEdit_width[0].setValue(9.5e-6);
-    form.VexoEdit_width[0].setEnabled(false);
-    EXPECT_FALSE(form.FPulseWidthOK(100000));
 }
 
 TEST_F(Calculate, FailedWidthTestSolvesNothing) {
-    typePrf(form, 100000);
-    form.VexoEdit_width[1].setValue(9e-6);
+    typePrf(100000);
+    row(1, 9e-6);
     form.b_calculate_Click();
     EXPECT_EQ(solver.created, 0);
-    EXPECT_EQ(ui.messages, std::vector<std::string>{kWidthLimit});
+    expectUnsolved({kWidthLimit});
     EXPECT_EQ(state.PRF, 0.0);
-    EXPECT_FALSE(form.b_apply.enabled);
     EXPECT_EQ(ui.pointers, (std::vector<Pointer>{Pointer::Busy, Pointer::Normal}));
 }
 
-// ---- Width and delay scans.
-
 TEST_F(Calculate, ScansLookAtEnabledRowsAfterTheFirst) {
-    form.VexoEdit_width[0].setValue(7e-6);
-    form.VexoEdit_width[0].setEnabled(false);
-    form.VexoEdit_width[1].setValue(0.5e-6);
-    form.VexoEdit_width[3].setValue(3e-6);
-    form.VexoEdit_width[4].setValue(0.1e-6);
-    form.VexoEdit_width[4].setEnabled(false);
+    row(0, 7e-6, 9e-6, false);
+    row(1, 0.5e-6);
+    form.VexoEdit_delay[1].setValue(1e-6);
+    form.VexoEdit_delay[1].setEnabled(false);  // the first row of a scan counts anyway
+    row(3, 3e-6);
+    row(4, 0.1e-6, -1, false);
     EXPECT_EQ(form.FMaxPulseWidth(), 7e-6);
     EXPECT_EQ(form.FMaxGateWidth(), 3e-6);
     EXPECT_EQ(form.FMinPulseWidth(), 0.5e-6);
-
-    form.VexoEdit_delay[0].setValue(9e-6);
-    form.VexoEdit_delay[1].setValue(1e-6);
-    form.VexoEdit_delay[1].setEnabled(false);  // the first row of the scan counts anyway
     EXPECT_EQ(form.FHighestGateDelay(), 1e-6);
     form.VexoEdit_delay[3].setValue(2e-6);
     EXPECT_EQ(form.FHighestGateDelay(), 2e-6);
 }
 
 TEST_F(Calculate, AutoGainAtThe50kHzBoundary) {
-    form.VexoEdit_width[0].setValue(500e-9);
+    row(0, 500e-9);
     state.PRF = 50000;
     EXPECT_EQ(form.FAutoGain(), 1);
     state.PRF = 50001;
     EXPECT_EQ(form.FAutoGain(), 0);
-    form.VexoEdit_width[2].setValue(50e-9);
+    row(2, 50e-9);
     EXPECT_EQ(form.FAutoGain(), 1);
 }
-
-// ---- Solving.
 
 TEST_F(Calculate, SecondPressWithoutChangeDoesNotSolveAgain) {
     form.b_calculate_Click();
@@ -96,33 +90,30 @@ TEST_F(Calculate, SecondPressWithoutChangeDoesNotSolveAgain) {
 }
 
 TEST_F(Calculate, NoSolutionKeepsEntriesAndApplyDisabled) {
-    typePrf(form, 12345);
+    typePrf(12345);
     solver.prf = 0.0;
     form.b_calculate_Click();
-    EXPECT_EQ(ui.messages, std::vector<std::string>{kNoSolution});
+    expectUnsolved({kNoSolution});
     EXPECT_EQ(form.VexoEdit_prf.value(), 12340);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    EXPECT_FALSE(form.b_apply.enabled);
     EXPECT_EQ(state.PRF, 0.0);
     EXPECT_EQ(form.lbl_DutyCycle.caption, "");
 }
 
 TEST_F(Calculate, ResultsGoIntoTheFieldsWithoutRunningRules) {
+    form.VexoEdit_pri.setValue(123e-6);
+    form.b_calculate_Click();
+    EXPECT_EQ(form.VexoEdit_pri.value(), 123e-6) << "an unmoved PRF leaves the interval alone";
+
+    typePrf(5000);
     solver.prf = 6000.5;  // would be cut to 6000 by the PRF rule
     solver.ifbw = 3001;
     form.b_calculate_Click();
     EXPECT_EQ(form.VexoEdit_prf.value(), 6000.5);
     EXPECT_EQ(form.VexoEdit_IFBW.value(), 3001);
-    EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 1 / 6000.5);  // the moved PRF's interval
+    EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 1 / 6000.5);
     EXPECT_FALSE(isTrue(state.NeedsCalculation));
     EXPECT_TRUE(form.b_apply.enabled);
     EXPECT_EQ(state.SolvedIFCount, 7);
-}
-
-TEST_F(Calculate, UnmovedPrfLeavesTheIntervalAlone) {
-    form.VexoEdit_pri.setValue(123e-6);
-    form.b_calculate_Click();
-    EXPECT_EQ(form.VexoEdit_pri.value(), 123e-6);
 }
 
 TEST_F(Calculate, ExternalDecadeFromTheDesiredPrf) {
@@ -130,9 +121,10 @@ TEST_F(Calculate, ExternalDecadeFromTheDesiredPrf) {
                                             {1e6, 2},  {500, -1},  {0.5, -4}};
     for (auto& width : form.VexoEdit_width) width.setValue(100e-9);  // fits 1 MHz
     for (const auto& [prf, decade] : cases) {
-        typePrf(form, prf);
+        SCOPED_TRACE(prf);
+        typePrf(prf);
         form.b_calculate_Click();
-        EXPECT_EQ(solver.decade, decade) << prf;
+        EXPECT_EQ(solver.decade, decade);
         EXPECT_EQ(solver.desiredPrf, prf);
     }
     EXPECT_EQ(solver.flag, kTrue);
@@ -140,7 +132,7 @@ TEST_F(Calculate, ExternalDecadeFromTheDesiredPrf) {
 }
 
 TEST_F(Calculate, ExternalPathPassesRoundedIfbwAndConverterDelay) {
-    ASSERT_EQ(form.VexoEdit_IFBW.enter(2500.5), std::nullopt);
+    type(form.VexoEdit_IFBW, 2500.5);
     form.b_calculate_Click();
     EXPECT_EQ(solver.ifbwHzIn, 2500);  // ties to even
     EXPECT_EQ(solver.converterDelay, 0.0);
@@ -155,15 +147,11 @@ TEST_F(Calculate, ExternalPathPassesRoundedIfbwAndConverterDelay) {
 
 TEST_F(Calculate, InternalGatedGetsGateRowsOnly) {
     load(twoPortInternal());
-    form.VexoEdit_width[0].setValue(8e-6);
-    form.VexoEdit_width[1].setValue(1e-6);
-    form.VexoEdit_width[3].setValue(3e-6);
-    form.VexoEdit_width[4].setValue(5e-6);
-    form.VexoEdit_width[4].setEnabled(false);
-    form.VexoEdit_delay[0].setValue(9e-6);
-    form.VexoEdit_delay[2].setValue(2e-6);
-    form.VexoEdit_delay[4].setValue(4e-6);
-    form.VexoEdit_delay[4].setEnabled(false);
+    row(0, 8e-6, 9e-6);
+    row(1, 1e-6);
+    row(2, 1e-6, 2e-6);
+    row(3, 3e-6);
+    row(4, 5e-6, 4e-6, false);
     solver.ifbw = 2500.5;
     form.b_calculate_Click();
     ASSERT_EQ(solver.calls, std::vector<std::string>{"SolveInternalGated"});
@@ -177,9 +165,7 @@ TEST_F(Calculate, InternalGatedGetsGateRowsOnly) {
 }
 
 TEST_F(Calculate, InternalWithoutSwGatingUsesThePlainSolveAndSlowClock) {
-    FakeAnalyzerSetup setup = twoPortInternal();
-    setup.hardwareValue = "3";
-    load(setup);
+    load(analyzer("KT622A", "K71 M81", 2, 1, "3"));
     form.m_NoSWGating_Click();
     form.b_calculate_Click();
     EXPECT_EQ(solver.calls, std::vector<std::string>{"SolveInternal"});
@@ -189,19 +175,17 @@ TEST_F(Calculate, InternalWithoutSwGatingUsesThePlainSolveAndSlowClock) {
 
 TEST_F(Calculate, ThrowingSolverIsReportedAndChangesNothing) {
     form.b_calculate_Click();  // a first solution to fall back on
-    ASSERT_EQ(form.VexoEdit_width[1].enter(2e-6), std::nullopt);
+    type(form.VexoEdit_width[1], 2e-6);
     const double lastPrf = state.PRF;
     state.SolvedIFCount = 3;
     solver.prf = 1234.0;
     solver.error = "solver exploded";
     ui.pointers.clear();
     form.b_calculate_Click();
-    EXPECT_EQ(ui.messages, std::vector<std::string>{"solver exploded"});
+    expectUnsolved({"solver exploded"});
     EXPECT_EQ(state.PRF, lastPrf);
     EXPECT_EQ(state.SolvedIFCount, 3);
     EXPECT_EQ(state.SolvedFreqOffset, 123.0);  // from the first solve, not the failed one
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    EXPECT_FALSE(form.b_apply.enabled);
     EXPECT_EQ(form.VexoEdit_prf.value(), 5000);
     EXPECT_EQ(ui.pointers, (std::vector<Pointer>{Pointer::Busy, Pointer::Normal}));
 }
@@ -211,8 +195,8 @@ TEST_F(Calculate, NonFinitePrfFromTheSolverIsAnError) {
     form.b_calculate_Click();
     ASSERT_EQ(ui.messages.size(), 1u);
     EXPECT_NE(ui.messages[0].find("invalid PRF"), std::string::npos);
+    expectUnsolved(ui.messages);
     EXPECT_EQ(state.PRF, 0.0);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
 }
 
 TEST(CalculateWithoutSolver, MissingSolverIsReported) {
@@ -226,17 +210,14 @@ TEST(CalculateWithoutSolver, MissingSolverIsReported) {
     EXPECT_TRUE(isTrue(state.NeedsCalculation));
 }
 
-// ---- Duty cycle.
-
 TEST_F(Calculate, DutyCycleListsEnabledRows) {
-    typePrf(form, 100000);
-    for (int row : {0, 2, 3, 4}) form.VexoEdit_width[row].setEnabled(false);
-    form.VexoEdit_width[1].setValue(1.25e-6);
+    typePrf(100000);
+    for (int r : {0, 2, 3, 4}) form.VexoEdit_width[r].setEnabled(false);
+    row(1, 1.25e-6);
     form.b_calculate_Click();
     EXPECT_EQ(form.lbl_DutyCycle.caption, "A IF Gate :12.5%\n");
 
-    form.VexoEdit_width[0].setEnabled(true);
-    form.VexoEdit_width[0].setValue(1.234567e-6);
+    row(0, 1.234567e-6);
     form.SUpdateDutyCycle();
     EXPECT_EQ(form.lbl_DutyCycle.caption, "Source Modulation :12.3457%\nA IF Gate :12.5%\n");
 }

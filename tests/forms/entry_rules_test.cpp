@@ -9,152 +9,119 @@ namespace {
 
 using EntryRules = FormTest;
 
-double prfAfterTyping(MainForm& form, double v, ChangeSource how = ChangeSource::Typed) {
-    EXPECT_EQ(form.VexoEdit_prf.enter(v, how), std::nullopt);
-    return form.VexoEdit_prf.value();
-}
-
-// ---- PRF and PRI.
-
 TEST_F(EntryRules, PrfAndPriFollowEachOther) {
-    prfAfterTyping(form, 10000);
+    typePrf(10000);
     EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 100e-6);
-    ASSERT_EQ(form.VexoEdit_pri.enter(200e-6), std::nullopt);
+    type(form.VexoEdit_pri, 200e-6);
     EXPECT_DOUBLE_EQ(form.VexoEdit_prf.value(), 5000);
     EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 200e-6);
+    // A PRF beyond the field's range is clamped before the rule reads it back.
+    type(form.VexoEdit_pri, 1e18);
+    EXPECT_EQ(form.VexoEdit_prf.value(), 0.001);
+    EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 1000);
+    type(form.VexoEdit_pri, 3.4e-9);
+    EXPECT_EQ(form.VexoEdit_prf.value(), 165e6);
 }
 
-TEST_F(EntryRules, PrfKeepsFourOrFiveCharacters) {
-    EXPECT_EQ(prfAfterTyping(form, 12345), 12340);
-    EXPECT_EQ(prfAfterTyping(form, 123.456), 123.4);
-    EXPECT_EQ(prfAfterTyping(form, 1000), 1000);
-    EXPECT_EQ(prfAfterTyping(form, 165e6), 165e6);
-    EXPECT_EQ(prfAfterTyping(form, 0.0012345), 0.001);
-}
-
-TEST_F(EntryRules, PrfExponentIsExactJustBelowAPowerOfTen) {
-    EXPECT_EQ(prfAfterTyping(form, 9999.999), 9999);
-    EXPECT_EQ(prfAfterTyping(form, 99999999.9), 99990000);
-    // Its text rounds up to "10000": the kept characters follow the text, not a tenth of it.
-    EXPECT_EQ(prfAfterTyping(form, std::nextafter(10000.0, 0.0)), 10000);
-}
-
-TEST_F(EntryRules, PrfStepsUpOnlyAfterAStep) {
-    EXPECT_EQ(prfAfterTyping(form, 10001), 10000);
-    EXPECT_EQ(prfAfterTyping(form, 10001, ChangeSource::Step), 10010);
-    EXPECT_EQ(prfAfterTyping(form, 123.41, ChangeSource::Step), 123.5);
-    // A four-character text is never stepped up.
-    EXPECT_EQ(prfAfterTyping(form, 1001, ChangeSource::Step), 1001);
+TEST_F(EntryRules, PrfKeepsFourOrFiveCharactersAndStepsUpOnlyAfterAStep) {
+    struct Case {
+        double entered;
+        ChangeSource how;
+        double kept;
+    };
+    constexpr auto T = ChangeSource::Typed;
+    constexpr auto S = ChangeSource::Step;
+    const Case cases[] = {
+        {12345, T, 12340},
+        {123.456, T, 123.4},
+        {1000, T, 1000},
+        {165e6, T, 165e6},
+        {0.0012345, T, 0.001},
+        {9999.999, T, 9999},  // the exponent is exact just below a power of ten
+        {99999999.9, T, 99990000},
+        // Its text rounds up to "10000": the kept characters follow the text.
+        {std::nextafter(10000.0, 0.0), T, 10000},
+        {10001, T, 10000},
+        {10001, S, 10010},
+        {123.41, S, 123.5},
+        {1001, S, 1001},  // a four-character text is never stepped up
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(testing::Message() << c.entered << (c.how == S ? " stepped" : " typed"));
+        type(form.VexoEdit_prf, c.entered, c.how);
+        EXPECT_EQ(form.VexoEdit_prf.value(), c.kept);
+    }
     // The program's own run of the rule never steps up, whatever the field saw last.
     form.VexoEdit_prf.setValue(20001);
     form.prfRule();
     EXPECT_EQ(form.VexoEdit_prf.value(), 20000);
 }
 
-TEST_F(EntryRules, ComputedPrfIsClampedToItsRangeFirst) {
-    ASSERT_EQ(form.VexoEdit_pri.enter(1e18), std::nullopt);
-    EXPECT_EQ(form.VexoEdit_prf.value(), 0.001);
-    EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 1000);
-    ASSERT_EQ(form.VexoEdit_pri.enter(3.4e-9), std::nullopt);
-    EXPECT_EQ(form.VexoEdit_prf.value(), 165e6);
-}
-
-TEST_F(EntryRules, ProgramWritesDoNotRunTheRules) {
+TEST_F(EntryRules, ProgramWritesDoNotRunTheRulesAndRefusedEntriesChangeNothing) {
     form.VexoEdit_prf.setValue(12345);
     form.VexoEdit_width[1].setValue(1.23456e-6);
     EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 200e-6);
     EXPECT_EQ(form.VexoEdit_width[1].value(), 1.23456e-6);
-}
 
-TEST_F(EntryRules, EveryTimingChangeInvalidates) {
-    solver.prf.reset();
-    form.b_calculate_Click();
-    ASSERT_TRUE(form.b_apply.enabled);
-    prfAfterTyping(form, 2000);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    EXPECT_FALSE(form.b_apply.enabled);
-
-    form.b_calculate_Click();
-    ASSERT_TRUE(form.b_apply.enabled);
-    ASSERT_EQ(form.VexoEdit_IFBW.enter(1000), std::nullopt);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    EXPECT_FALSE(form.b_apply.enabled);
-    EXPECT_FALSE(form.m_PulseProfile.enabled);
-    EXPECT_FALSE(form.b_PulseProfile.enabled);
-}
-
-TEST_F(EntryRules, RefusedEntryChangesNothing) {
     EXPECT_NE(form.VexoEdit_prf.enter(200e6), std::nullopt);
-    EXPECT_EQ(form.VexoEdit_prf.value(), 5000);
+    EXPECT_EQ(form.VexoEdit_prf.value(), 12345);
     EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 200e-6);
 }
 
-// ---- Delays: the 340-degree limit.
-
-TEST_F(EntryRules, DelayIsPulledBackTo340Degrees) {
-    prfAfterTyping(form, 100000);
-    ASSERT_EQ(form.VexoEdit_delay[1].enter(9.5e-6), std::nullopt);
-    EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 9.444e-6);
-    ASSERT_EQ(form.VexoEdit_delay[2].enter(9.4e-6), std::nullopt);
-    EXPECT_DOUBLE_EQ(form.VexoEdit_delay[2].value(), 9.4e-6);
+TEST_F(EntryRules, EveryTimingChangeInvalidates) {
+    const std::function<void()> changes[] = {[&] { typePrf(2000); },
+                                             [&] { type(form.VexoEdit_IFBW, 1000); }};
+    for (const auto& change : changes) {
+        form.b_calculate_Click();
+        ASSERT_TRUE(form.b_apply.enabled);
+        change();
+        EXPECT_TRUE(isTrue(state.NeedsCalculation));
+        EXPECT_FALSE(form.b_apply.enabled);
+        EXPECT_FALSE(form.m_PulseProfile.enabled);
+        EXPECT_FALSE(form.b_PulseProfile.enabled);
+    }
 }
 
-TEST_F(EntryRules, PrfChangePullsBackEnabledDelaysOnly) {
-    prfAfterTyping(form, 100000);
-    ASSERT_EQ(form.VexoEdit_delay[1].enter(9.4e-6), std::nullopt);
+TEST_F(EntryRules, DelaysArePulledBackTo340Degrees) {
+    typePrf(100000);
+    type(form.VexoEdit_delay[1], 9.5e-6);
+    EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 9.444e-6);
+    type(form.VexoEdit_delay[1], 9.4e-6);
+    EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 9.4e-6);
+
+    // A PRF change pulls back the enabled delays only: 372 degrees -> 340 / (110 kHz x 360).
     form.VexoEdit_delay[2].setValue(9.4e-6);
     form.VexoEdit_delay[2].setEnabled(false);
-    prfAfterTyping(form, 110000);
-    // 372 degrees -> 340 / (110 kHz x 360) = 8.5858... us, four significant digits.
+    typePrf(110000);
     EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 8.585e-6);
     EXPECT_DOUBLE_EQ(form.VexoEdit_delay[2].value(), 9.4e-6);
 }
 
-// ---- Widths and shared generator outputs.
-
 TEST_F(EntryRules, WidthIsNormalisedAndStepsUpOnlyFromAStep) {
-    ASSERT_EQ(form.VexoEdit_width[1].enter(0.0012341), std::nullopt);
+    type(form.VexoEdit_width[1], 0.0012341);
     EXPECT_DOUBLE_EQ(form.VexoEdit_width[1].value(), 0.001234);
-    ASSERT_EQ(form.VexoEdit_width[1].enter(0.0012341, ChangeSource::Step), std::nullopt);
+    type(form.VexoEdit_width[1], 0.0012341, ChangeSource::Step);
     EXPECT_DOUBLE_EQ(form.VexoEdit_width[1].value(), 0.001244);
 }
 
 TEST_F(EntryRules, RowsOnTheSameExternalOutputFollowEachOther) {
-    PGRow shared = state.SReadRow(1);
-    state.SWriteRow(3, shared);
+    state.SWriteRow(3, state.SReadRow(1));
     EXPECT_EQ(form.sharedRows(1), std::vector<int>{3});
     EXPECT_EQ(form.sharedRows(3), std::vector<int>{1});
     EXPECT_TRUE(form.sharedRows(2).empty());
 
-    ASSERT_EQ(form.VexoEdit_width[1].enter(2e-6), std::nullopt);
+    type(form.VexoEdit_width[1], 2e-6);
     EXPECT_EQ(form.VexoEdit_width[3].value(), 2e-6);
-    ASSERT_EQ(form.VexoEdit_delay[3].enter(3e-6), std::nullopt);
+    type(form.VexoEdit_delay[3], 3e-6);
     EXPECT_EQ(form.VexoEdit_delay[1].value(), 3e-6);
     EXPECT_EQ(form.VexoEdit_width[2].value(), 1e-6);
     EXPECT_EQ(form.VexoEdit_delay[2].value(), 0);
-}
 
-TEST_F(EntryRules, SameAddressOtherOutputIsNotShared) {
-    PGRow row = state.SReadRow(1);
-    row.gateOutput = static_cast<std::int16_t>(row.gateOutput == 1 ? 2 : 1);
-    state.SWriteRow(3, row);
+    // The same address on another output, or an unreadable address, shares with nobody.
+    PGRow other = state.SReadRow(1);
+    other.gateOutput = static_cast<std::int16_t>(other.gateOutput == 1 ? 2 : 1);
+    state.SWriteRow(3, other);
     EXPECT_TRUE(form.sharedRows(1).empty());
-}
-
-TEST_F(EntryRules, InternalGeneratorsShareByInternalOutputOnly) {
-    load(twoPortInternal());
-    ASSERT_EQ(state.UseInternalPG, kChecked);
-    // Row 0 drives output 1, every gate row output 2, whatever their GPIB settings.
-    EXPECT_EQ(form.sharedRows(2), (std::vector<int>{1, 3, 4}));
-    ASSERT_EQ(form.VexoEdit_width[3].enter(4e-6), std::nullopt);
-    for (int row = 1; row <= 4; ++row) EXPECT_EQ(form.VexoEdit_width[row].value(), 4e-6) << row;
-    EXPECT_EQ(form.VexoEdit_width[0].value(), 1e-6);
-    ASSERT_EQ(form.VexoEdit_delay[1].enter(5e-6), std::nullopt);
-    EXPECT_EQ(form.VexoEdit_delay[4].value(), 5e-6);
-    EXPECT_EQ(form.VexoEdit_delay[0].value(), 0);
-}
-
-TEST_F(EntryRules, UnreadableTableRowSharesWithNobody) {
     state.SWriteRow(3, state.SReadRow(1));
     state.Table.cell(3, GpibAddress) = std::string("abc");
     EXPECT_TRUE(form.sharedRows(1).empty());
@@ -162,12 +129,25 @@ TEST_F(EntryRules, UnreadableTableRowSharesWithNobody) {
     EXPECT_EQ(form.VexoEdit_width[3].enter(2e-6), std::nullopt);
 }
 
+TEST_F(EntryRules, InternalGeneratorsShareByInternalOutputOnly) {
+    load(twoPortInternal());
+    ASSERT_EQ(state.UseInternalPG, kChecked);
+    // Row 0 drives output 1, every gate row output 2, whatever their GPIB settings.
+    EXPECT_EQ(form.sharedRows(2), (std::vector<int>{1, 3, 4}));
+    type(form.VexoEdit_width[3], 4e-6);
+    for (int row = 1; row <= 4; ++row) EXPECT_EQ(form.VexoEdit_width[row].value(), 4e-6) << row;
+    EXPECT_EQ(form.VexoEdit_width[0].value(), 1e-6);
+    type(form.VexoEdit_delay[1], 5e-6);
+    EXPECT_EQ(form.VexoEdit_delay[4].value(), 5e-6);
+    EXPECT_EQ(form.VexoEdit_delay[0].value(), 0);
+}
+
 TEST_F(EntryRules, NoSwGatingKeepsApplyOnAWidthChange) {
     form.m_NoSWGating_Click();
     form.b_calculate_Click();
     ASSERT_TRUE(form.b_apply.enabled);
     form.m_PulseProfile.enabled = form.b_PulseProfile.enabled = true;
-    ASSERT_EQ(form.VexoEdit_width[2].enter(3e-6), std::nullopt);
+    type(form.VexoEdit_width[2], 3e-6);
     EXPECT_TRUE(form.b_apply.enabled);
     EXPECT_FALSE(isTrue(state.NeedsCalculation));
     EXPECT_FALSE(form.b_PulseProfile.enabled);
@@ -175,7 +155,7 @@ TEST_F(EntryRules, NoSwGatingKeepsApplyOnAWidthChange) {
 
     form.m_NoSWGating_Click();  // unchecked again: the next change invalidates
     form.b_calculate_Click();
-    ASSERT_EQ(form.VexoEdit_width[2].enter(4e-6), std::nullopt);
+    type(form.VexoEdit_width[2], 4e-6);
     EXPECT_FALSE(form.b_apply.enabled);
 }
 
@@ -185,10 +165,7 @@ TEST_F(EntryRules, RowsOutsideTheWindowAreRefused) {
     EXPECT_TRUE(form.sharedRows(7).empty());
 }
 
-// ---- Fixed PRF.
-
 TEST_F(EntryRules, FixedPrfBoxSetsTheFlagOnly) {
-    ASSERT_TRUE(isTrue(state.FixedPRF));
     form.setFixedPRF(false);
     EXPECT_EQ(form.chk_FixedPRF.value, kUnchecked);
     EXPECT_EQ(state.FixedPRF, kFalse);

@@ -35,44 +35,42 @@ struct FakeLog {
     std::vector<std::string> commands;
 };
 
-class FakeCaps : public AnalyzerCaps {
+// What every fake part reads its answers from and logs to.
+struct FakeParts {
+    const FakeAnalyzerSetup& s_;
+    FakeLog& log_;
+};
+
+class FakeCaps : public AnalyzerCaps, FakeParts {
   public:
-    FakeCaps(const FakeAnalyzerSetup& s, FakeLog& log) : s_(s), log_(log) {}
+    explicit FakeCaps(FakeParts p) : FakeParts(p) {}
     int portCount() override { return ++log_.capsReads, s_.ports; }
     int sourceCount() override { return ++log_.capsReads, s_.sources; }
     std::string hardwareValue() override { return s_.hardwareValue; }
     double minFrequency() override { return 10e6; }
     double maxFrequency() override { return 26.5e9; }
-
-  private:
-    const FakeAnalyzerSetup& s_;
-    FakeLog& log_;
 };
 
-class FakeParser : public CommandParser {
+class FakeParser : public CommandParser, FakeParts {
   public:
-    FakeParser(const FakeAnalyzerSetup& s, FakeLog& log) : s_(s), log_(log) {}
+    explicit FakeParser(FakeParts p) : FakeParts(p) {}
     std::string parse(const std::string& command) override {
         log_.commands.push_back(command);
         if (s_.helpError) throw InstrumentError(-1, *s_.helpError);
         return s_.helpReply;
     }
-
-  private:
-    const FakeAnalyzerSetup& s_;
-    FakeLog& log_;
 };
 
-class FakeAnalyzer : public AnalyzerApplication {
+class FakeAnalyzer : public AnalyzerApplication, FakeParts {
   public:
-    FakeAnalyzer(const FakeAnalyzerSetup& s, FakeLog& log) : s_(s), log_(log) {}
+    explicit FakeAnalyzer(FakeParts p) : FakeParts(p) {}
     std::unique_ptr<Channel> currentChannel() override { return nullptr; }
     std::unique_ptr<ChannelCollection> channels() override { return nullptr; }
     void setUpdateSwitch(bool) override {}
     void setBusSwitch(bool) override {}
     std::unique_ptr<MessageArea> messageArea() override { return nullptr; }
     std::unique_ptr<CommandParser> commandParser() override {
-        return std::make_unique<FakeParser>(s_, log_);
+        return std::make_unique<FakeParser>(FakeParts{s_, log_});
     }
     std::string modelText() override {
         if (s_.modelError) throw InstrumentError(-999, *s_.modelError);
@@ -80,16 +78,12 @@ class FakeAnalyzer : public AnalyzerApplication {
     }
     std::string optionText() override { return s_.optionText; }
     std::unique_ptr<AnalyzerCaps> hardwareInfo() override {
-        return std::make_unique<FakeCaps>(s_, log_);
+        return std::make_unique<FakeCaps>(FakeParts{s_, log_});
     }
     std::unique_ptr<Measurement> activeMeasurement() override { return nullptr; }
     void setTriggerSource(int) override {}
     void setTriggerMode(int) override {}
     void acquirePoint(bool, bool) override {}
-
-  private:
-    const FakeAnalyzerSetup& s_;
-    FakeLog& log_;
 };
 
 class FakeBench : public Bench {
@@ -100,7 +94,7 @@ class FakeBench : public Bench {
     std::unique_ptr<AnalyzerApplication> connectAnalyzer() override {
         ++log.connects;
         if (setup.unreachable) throw InstrumentError(-2147221005, "Analyzer not reachable");
-        return std::make_unique<FakeAnalyzer>(setup, log);
+        return std::make_unique<FakeAnalyzer>(FakeParts{setup, log});
     }
     std::unique_ptr<InstrumentBus> createBus() override {
         throw InstrumentError(kOwnCheckError, "no bus on the fake bench");

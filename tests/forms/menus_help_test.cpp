@@ -15,39 +15,37 @@ class Menus : public FormTest {
     }
 };
 
-TEST_F(Menus, NoSwGatingTogglesAndInvalidates) {
-    form.m_NoSWGating_Click();
-    EXPECT_TRUE(form.m_NoSWGating.checked);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    EXPECT_FALSE(form.b_apply.enabled);
-    EXPECT_FALSE(form.m_PulseProfile.enabled);
-    EXPECT_FALSE(form.b_PulseProfile.enabled);
-    form.m_NoSWGating_Click();
-    EXPECT_FALSE(form.m_NoSWGating.checked);
+TEST_F(Menus, MeasurementModesToggleAndInvalidate) {
+    struct Case {
+        MenuEntry MainForm::*entry;
+        void (MainForm::*click)();
+        bool applyAfter;
+        bool profileAfter;
+    };
+    const Case cases[] = {
+        {&MainForm::m_NoSWGating, &MainForm::m_NoSWGating_Click, false, false},
+        {&MainForm::m_ConverterMeas, &MainForm::m_ConverterMeas_Click, false, true},
+        {&MainForm::m_NoPG, &MainForm::m_NoPG_Click, true, false},
+    };
+    for (const Case& c : cases) {
+        SetUp();
+        SCOPED_TRACE((form.*c.entry).name);
+        (form.*c.click)();
+        EXPECT_TRUE((form.*c.entry).checked);
+        EXPECT_TRUE(isTrue(state.NeedsCalculation));
+        EXPECT_EQ(form.b_apply.enabled, c.applyAfter);
+        EXPECT_EQ(form.b_PulseProfile.enabled, c.profileAfter);
+        EXPECT_EQ(form.m_PulseProfile.enabled, c.profileAfter);
+        (form.*c.click)();
+        EXPECT_FALSE((form.*c.entry).checked);
+    }
 }
 
-TEST_F(Menus, ConverterMeasurementsDisablesApplyOnly) {
-    form.m_ConverterMeas_Click();
-    EXPECT_TRUE(form.m_ConverterMeas.checked);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    EXPECT_FALSE(form.b_apply.enabled);
-    EXPECT_TRUE(form.b_PulseProfile.enabled);
-    form.m_ConverterMeas_Click();
-    EXPECT_FALSE(form.m_ConverterMeas.checked);
-}
-
-TEST_F(Menus, NoPulseGeneratorsLocksTheGatesButKeepsApply) {
+TEST_F(Menus, NoPulseGeneratorsLocksTheGatesUntilCleared) {
     form.m_NoPG_Click();
-    EXPECT_TRUE(form.m_NoPG.checked);
-    EXPECT_FALSE(form.b_PulseProfile.enabled);
-    EXPECT_FALSE(form.m_PulseProfile.enabled);
     EXPECT_FALSE(form.m_ConfigPG.enabled);
     EXPECT_FALSE(form.frm_gates.enabled);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    EXPECT_TRUE(form.b_apply.enabled);
-
     form.m_NoPG_Click();
-    EXPECT_FALSE(form.m_NoPG.checked);
     EXPECT_TRUE(form.m_ConfigPG.enabled);
     EXPECT_TRUE(form.frm_gates.enabled);
     EXPECT_FALSE(form.b_PulseProfile.enabled);  // the next Apply decides
@@ -64,23 +62,24 @@ TEST_F(Menus, PulsedBoxOnlyStoresItsValue) {
 
 using Help = FormTest;
 
-TEST_F(Help, OpensTheReportedFileWithoutQuotesOrLineEnds) {
-    const int connectsBefore = bench.log.connects;
-    bench.setup.helpReply = "\"/opt/zentra/help/zentra-pulse.html\"\r\n";
-    form.m_contents_Click();
-    EXPECT_EQ(bench.log.connects, connectsBefore + 1);  // a connection of its own
-    EXPECT_EQ(bench.log.commands, std::vector<std::string>{"DIAG:HELP:FILE?"});
-    ASSERT_EQ(ui.helpCalls.size(), 1u);
-    EXPECT_EQ(ui.helpCalls[0].file, "/opt/zentra/help/zentra-pulse.html");
-    EXPECT_EQ(ui.helpCalls[0].topic, 1114);
+TEST_F(Help, OpensTheReportedFileWithoutQuotesOrLineFeeds) {
+    const std::pair<const char*, const char*> replies[] = {
+        {"\"/opt/zentra/help/zentra-pulse.html\"\r\n", "/opt/zentra/help/zentra-pulse.html"},
+        {"\"C:\\Help\\\"zentra\".html\"\n", "C:\\Help\\zentra.html"},  // quotes inside too
+    };
+    for (const auto& [reply, file] : replies) {
+        SCOPED_TRACE(reply);
+        bench.log = {};
+        ui.helpCalls.clear();
+        bench.setup.helpReply = reply;
+        form.m_contents_Click();
+        EXPECT_EQ(bench.log.connects, 1);  // a connection of its own
+        EXPECT_EQ(bench.log.commands, std::vector<std::string>{"DIAG:HELP:FILE?"});
+        ASSERT_EQ(ui.helpCalls.size(), 1u);
+        EXPECT_EQ(ui.helpCalls[0].file, file);
+        EXPECT_EQ(ui.helpCalls[0].topic, 1114);
+    }
     EXPECT_TRUE(ui.messages.empty());
-}
-
-TEST_F(Help, QuotesInsideThePathAreRemovedToo) {
-    bench.setup.helpReply = "\"C:\\Help\\\"zentra\".html\"\n";
-    form.m_contents_Click();
-    ASSERT_EQ(ui.helpCalls.size(), 1u);
-    EXPECT_EQ(ui.helpCalls[0].file, "C:\\Help\\zentra.html");
 }
 
 TEST_F(Help, FailingQueryIsReportedNotThrown) {
