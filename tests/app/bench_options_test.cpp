@@ -1,5 +1,8 @@
 #include <gtest/gtest.h>
 
+#include <optional>
+#include <sstream>
+
 #include "lib/bench_options.h"
 
 namespace zp::app {
@@ -86,15 +89,41 @@ TEST(BenchOptions, MakesTheBenchItDescribes) {
 
     o.traceFile = "/nonexistent-dir/trace.log";
     EXPECT_THROW(makeBench(o), std::exception);
+    std::ostringstream err;
+    EXPECT_EQ(makeBenchOrReport(o, Program::Gui, err), nullptr);
+    EXPECT_EQ(err.str().rfind("zentra-pulse: ", 0), 0u) << err.str();
 }
 
-TEST(BenchOptions, ModelListHasOneLinePerModelWithPortsAndSources) {
-    const std::string text = modelListText();
-    EXPECT_NE(text.find("kt655\tKT655A\tK71 M83 M84\t4\t3\n"), std::string::npos) << text;
-    EXPECT_NE(text.find("kt611\tKT611A\t-\t2\t1\n"), std::string::npos) << text;
+TEST(BenchOptions, EarlyExitsAnswerHelpVersionModelsAndUsageErrors) {
+    struct Case {
+        std::vector<std::string> args;
+        std::optional<int> status;
+        std::string out;
+        std::string err;
+    };
+    const Case cases[] = {
+        {{"show"}, std::nullopt, "", ""},
+        {{"--version"}, 0, std::string("zentra-pulse-cli ") + ZP_VERSION + "\n", ""},
+        {{"--list-models"}, 0, modelListText(), ""},
+        {{"--help"}, 0, usageText(Program::Cli), ""},
+        {{"--nope"},
+         2,
+         "",
+         "zentra-pulse-cli: unknown option '--nope'\nTry 'zentra-pulse-cli --help'.\n"},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.args.front());
+        std::ostringstream out;
+        std::ostringstream err;
+        EXPECT_EQ(earlyExit(cli(c.args), Program::Cli, out, err), c.status);
+        EXPECT_EQ(out.str(), c.out);
+        EXPECT_EQ(err.str(), c.err);
+    }
+    const std::string models = modelListText();
+    EXPECT_NE(models.find("kt655\tKT655A\tK71 M83 M84\t4\t3\n"), std::string::npos) << models;
+    EXPECT_NE(models.find("kt611\tKT611A\t-\t2\t1\n"), std::string::npos) << models;
     EXPECT_NE(usageText(Program::Cli).find("calculate"), std::string::npos);
     EXPECT_EQ(usageText(Program::Gui).find("calculate"), std::string::npos);
-    EXPECT_EQ(versionText(Program::Cli), std::string("zentra-pulse-cli ") + ZP_VERSION + "\n");
 }
 
 }  // namespace

@@ -1,10 +1,9 @@
-// The Qt services: file filters, the busy pointer, the help file check, the single instance.
+// The Qt services: file filters, the busy pointer, the help file check, the instance key.
 
 #include <gtest/gtest.h>
 
 #include <QCursor>
 #include <QDir>
-#include <QElapsedTimer>
 #include <QFile>
 #include <QTemporaryDir>
 #include <QTextBrowser>
@@ -101,22 +100,6 @@ TEST_F(HelpFiles, ShowHelpOpensTheViewerAtTheTopicOrSaysWhyNot) {
     ASSERT_NE(ui.helpViewer(), nullptr);
     EXPECT_EQ(ui.helpViewer()->browser()->source().fragment(), "topic-1114");
     EXPECT_TRUE(ui.helpViewer()->isVisible());
-}
-
-TEST(SingleInstance, SecondStartHandsOverAndTheFirstIsAskedToRaise) {
-    application();
-    const QString key = QStringLiteral("zp-ui-test-%1").arg(QCoreApplication::applicationPid());
-    SingleInstance first(key);
-    ASSERT_EQ(first.start(), SingleInstance::Role::Primary);
-    int raised = 0;
-    QObject::connect(&first, &SingleInstance::raiseRequested, [&] { ++raised; });
-
-    SingleInstance second(key);
-    EXPECT_EQ(second.start(), SingleInstance::Role::Secondary);
-    QElapsedTimer timer;
-    timer.start();
-    while (raised == 0 && timer.elapsed() < 5000) QCoreApplication::processEvents();
-    EXPECT_EQ(raised, 1);
 }
 
 TEST(SingleInstance, KeyIsNamedAfterTheUserUnlessOverridden) {
