@@ -165,15 +165,5 @@ TEST_F(EntryRules, RowsOutsideTheWindowAreRefused) {
     EXPECT_TRUE(form.sharedRows(7).empty());
 }
 
-TEST_F(EntryRules, FixedPrfBoxSetsTheFlagOnly) {
-    form.setFixedPRF(false);
-    EXPECT_EQ(form.chk_FixedPRF.value, kUnchecked);
-    EXPECT_EQ(state.FixedPRF, kFalse);
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
-    form.chk_FixedPRF.value = kChecked;
-    form.chk_FixedPRF_Click();
-    EXPECT_EQ(state.FixedPRF, kTrue);
-}
-
 }  // namespace
 }  // namespace zp::test

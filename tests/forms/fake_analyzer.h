@@ -171,13 +171,8 @@ class RecordingSolver : public TimingSolver {
                        double& pulseClockHz, std::vector<std::int32_t>& list1,
                        std::vector<std::int32_t>&, std::vector<std::int32_t>&,
                        Bool16 fixedPrf) override {
-        s_.calls.push_back("SolveInternal");
-        record(prf, ifbw, pulseClockHz, fixedPrf);
-        time1 = 1.0;
-        time2 = 2.0;
-        list1 = {1, 2, 3};
-        answer(prf);
-        if (s_.ifbw) ifbw = *s_.ifbw;
+        internal("SolveInternal", prf, ifbw, time2, time1, pulseClockHz, list1, fixedPrf,
+                 {1, 2, 3});
     }
 
     void SolveInternalGated(double& prf, double& ifbw, double& time2, double& time1,
@@ -185,27 +180,30 @@ class RecordingSolver : public TimingSolver {
                             std::vector<std::int32_t>&, std::vector<std::int32_t>&, Bool16 fixedPrf,
                             double highestGateDelay, double widestGateWidth, double& gatedTime1,
                             double&, std::int32_t& gatedTicks) override {
-        s_.calls.push_back("SolveInternalGated");
-        record(prf, ifbw, pulseClockHz, fixedPrf);
         s_.highestGateDelay = highestGateDelay;
         s_.widestGateWidth = widestGateWidth;
-        time1 = 1.0;
-        time2 = 2.0;
-        list1 = {4, 5};
         gatedTime1 = highestGateDelay;
         gatedTicks = 42;
-        answer(prf);
-        if (s_.ifbw) ifbw = *s_.ifbw;
+        internal("SolveInternalGated", prf, ifbw, time2, time1, pulseClockHz, list1, fixedPrf,
+                 {4, 5});
     }
 
     void SolveReceiver(double, double, std::int16_t& rxValue) override { rxValue = 0; }
 
   private:
-    void record(double prf, double ifbw, double clock, Bool16 fixedPrf) {
+    void internal(const char* name, double& prf, double& ifbw, double& time2, double& time1,
+                  double clock, std::vector<std::int32_t>& list1, Bool16 fixedPrf,
+                  std::vector<std::int32_t> answerList) {
+        s_.calls.push_back(name);
         s_.desiredPrf = prf;
         s_.ifbwIn = ifbw;
         s_.pulseClockHz = clock;
         s_.fixedPrf = fixedPrf;
+        time1 = 1.0;
+        time2 = 2.0;
+        list1 = std::move(answerList);
+        answer(prf);
+        if (s_.ifbw) ifbw = *s_.ifbw;
     }
     // Results are written before a scripted error, so that a restore has something to undo.
     void answer(double& prf) {

@@ -76,16 +76,6 @@ TEST_F(Startup, SecondLoadStartsFromTheDesignedWindow) {
     EXPECT_EQ(form.lbl_gate[2].caption, "B IF Gate :");
 }
 
-TEST_F(Startup, ViewsAreToldOnceLoaded) {
-    int refreshes = 0;
-    form.onChanged([&] { ++refreshes; });
-    load(twoPortInternal());
-    EXPECT_GE(refreshes, 1);
-    const int before = refreshes;
-    type(form.VexoEdit_width[1], 2e-6);
-    EXPECT_GT(refreshes, before);
-}
-
 TEST(FailingStartup, AnalyzerErrorPropagatesAndLeavesTheStateAlone) {
     FakeAnalyzerSetup modelError = fourPortThreeSources();
     modelError.modelError = "-999 Analyzer not responding";
