@@ -32,30 +32,23 @@ class SimGpibBusTest : public ::testing::Test {
     SimGpibBus bus{generators, &trace, &faults};
 };
 
-TEST_F(SimGpibBusTest, QueryRoundTripIsTraced) {
+TEST_F(SimGpibBusTest, QueryRoundTripIsTracedOnDistinctDescriptors) {
     const auto d = open(11);
-    EXPECT_GT(d, 0);
-    EXPECT_EQ(bus.addressOf(d), 11);
+    const auto d12 = open(12);
+    const auto again = open(11);
+    for (auto x : {d, d12, again}) EXPECT_TRUE(x > 0 && x < 100);
+    EXPECT_TRUE(d != d12 && d != again);
+    EXPECT_EQ(bus.addressOf(d12), 12);
+    EXPECT_EQ(bus.addressOf(999), -1);
+    trace.clear();
     bus.writeText(d, "*IDN?\n");
     EXPECT_EQ(bus.status(), 0);
     EXPECT_EQ(read(d), "Veltrix,PG8102A,SIM11,1.0\n");
     EXPECT_EQ(bus.status(), 0);
     bus.clearDevice(d);
-    const std::vector<std::string> expected = {"BUS 11 open", "BUS 11 W \"*IDN?\\n\"",
-                                               "BUS 11 R \"Veltrix,PG8102A,SIM11,1.0\\n\"",
-                                               "BUS 11 clear"};
-    EXPECT_EQ(trace.lines(), expected);
-}
-
-TEST_F(SimGpibBusTest, DescriptorsAreDistinctSmallAndPositive) {
-    const auto a = open(11);
-    const auto b = open(12);
-    const auto c = open(11);
-    EXPECT_NE(a, b);
-    EXPECT_NE(a, c);
-    for (auto d : {a, b, c}) EXPECT_TRUE(d > 0 && d < 100);
-    EXPECT_EQ(bus.addressOf(b), 12);
-    EXPECT_EQ(bus.addressOf(999), -1);
+    EXPECT_EQ(trace.lines(), (std::vector<std::string>{"BUS 11 W \"*IDN?\\n\"",
+                                                       "BUS 11 R \"Veltrix,PG8102A,SIM11,1.0\\n\"",
+                                                       "BUS 11 clear"}));
 }
 
 TEST_F(SimGpibBusTest, ReadIsLimitedToTheBufferAndKeepsTheRest) {
@@ -64,25 +57,14 @@ TEST_F(SimGpibBusTest, ReadIsLimitedToTheBufferAndKeepsTheRest) {
     EXPECT_EQ(read(d, 2), "Ve");
     EXPECT_EQ(read(d), "ltrix,PG8102A,SIM11,1.0\n");
     // Nothing left: the next read times out and leaves the buffer alone.
-    std::string buffer(5, 'x');
-    bus.readText(d, buffer);
+    EXPECT_EQ(read(d, 5), "     ");
     EXPECT_EQ(bus.status(), kErr | kTimo);
-    EXPECT_EQ(buffer, "xxxxx");
-}
-
-TEST_F(SimGpibBusTest, OpcHandshakeFitsTwoCharacterBuffer) {
-    const auto d = open(12);
+    // A new query drops an unread reply; "*OPC?" fits a two-character buffer.
+    bus.writeText(d, "*IDN?\n");
     bus.writeText(d, ":SOUR:PULS:DEL1 2E-06\n");
     bus.writeText(d, "*OPC?\n");
     EXPECT_EQ(read(d, 2), "1\n");
-    EXPECT_DOUBLE_EQ(generators[12]->state().outputs[0].delay, 2e-6);
-}
-
-TEST_F(SimGpibBusTest, NewQueryDiscardsUnreadReply) {
-    const auto d = open(11);
-    bus.writeText(d, "*IDN?\n");
-    bus.writeText(d, ":SYST:ERR?\n");
-    EXPECT_EQ(read(d), "+0,\"No error\"\n");
+    EXPECT_DOUBLE_EQ(generators[11]->state().outputs[0].delay, 2e-6);
 }
 
 TEST_F(SimGpibBusTest, NoListenerFailsTheFirstWrite) {
@@ -91,55 +73,9 @@ TEST_F(SimGpibBusTest, NoListenerFailsTheFirstWrite) {
     EXPECT_EQ(bus.status(), 0);
     bus.writeText(d, "*IDN?\n");
     EXPECT_EQ(bus.status(), kErr);
-    std::string buffer(100, ' ');
-    bus.readText(d, buffer);
+    EXPECT_EQ(read(d), std::string(100, ' '));
     EXPECT_NE(bus.status() & kErr, 0);
-    EXPECT_EQ(buffer, std::string(100, ' '));
-    const auto lines = trace.lines();
-    ASSERT_GE(lines.size(), 3u);
-    EXPECT_EQ(lines[0], "BUS 5 open");
-    EXPECT_EQ(lines[1], "BUS 5 W \"*IDN?\\n\"");
-    EXPECT_EQ(lines[2], "BUS 5 error no listener");
-}
-
-TEST_F(SimGpibBusTest, SilentGeneratorTimesOutOnIdentificationOnly) {
-    faults.silentGenerators.insert(11);
-    const auto d = open(11);
-    bus.writeText(d, "*IDN?\n");
-    EXPECT_EQ(bus.status(), 0);
-    read(d);
-    EXPECT_EQ(bus.status(), kErr | kTimo);
-    EXPECT_EQ(trace.lines().back(), "BUS 11 timeout");
-    bus.writeText(d, ":SYST:ERR?\n");
-    EXPECT_EQ(read(d), "+0,\"No error\"\n");
-}
-
-TEST_F(SimGpibBusTest, TimeoutGeneratorTimesOutOnEveryRead) {
-    faults.timeoutGenerators.insert(12);
-    const auto d = open(12);
-    for (const char* q : {"*IDN?\n", "*OPC?\n", ":SYST:ERR?\n"}) {
-        bus.writeText(d, q);
-        EXPECT_EQ(bus.status(), 0);
-        read(d);
-        EXPECT_EQ(bus.status(), kErr | kTimo) << q;
-    }
-    // Writes still reach the generator.
-    bus.writeText(d, ":OUTP1:STAT ON\n");
-    EXPECT_TRUE(generators[12]->state().outputs[0].on);
-}
-
-TEST_F(SimGpibBusTest, QueuedErrorIsPushedWhenTheDeviceOpens) {
-    faults.generatorErrors[11] = "-222,\"Data out of range\"";
-    EXPECT_TRUE(generators[11]->state().errorQueue.empty());
-    const auto d = open(11);
-    bus.writeText(d, ":SYST:ERR?\n");
-    EXPECT_EQ(read(d), "-222,\"Data out of range\"\n");
-    bus.writeText(d, ":SYST:ERR?\n");
-    EXPECT_EQ(read(d), "+0,\"No error\"\n");
-    // Generator 12 is not affected.
-    const auto d12 = open(12);
-    bus.writeText(d12, ":SYST:ERR?\n");
-    EXPECT_EQ(read(d12), "+0,\"No error\"\n");
+    EXPECT_EQ(trace.lines().at(2), "BUS 5 error no listener");
 }
 
 TEST_F(SimGpibBusTest, BadBoardAddressAndDescriptor) {
@@ -148,8 +84,7 @@ TEST_F(SimGpibBusTest, BadBoardAddressAndDescriptor) {
     EXPECT_EQ(bus.status(), kErr);
     bus.writeText(77, "*IDN?\n");
     EXPECT_EQ(bus.status(), kErr);
-    const auto d = open(11);
-    bus.writeText(d, "*IDN?\n");
+    bus.writeText(open(11), "*IDN?\n");
     EXPECT_EQ(bus.status(), 0);  // a good call clears the error
 }
 
@@ -162,6 +97,30 @@ TEST_F(SimGpibBusTest, ClearDiscardsPendingReplyButNotErrorQueue) {
     EXPECT_EQ(bus.status(), kErr | kTimo);
     bus.writeText(d, ":SYST:ERR?\n");
     EXPECT_EQ(read(d), "-113,\"Undefined header\"\n");
+}
+
+TEST_F(SimGpibBusTest, GeneratorFaultsShowOnTheirAddressOnly) {
+    faults.silentGenerators.insert(11);
+    faults.timeoutGenerators.insert(12);
+    faults.generatorErrors[11] = "-222,\"Data out of range\"";
+    const auto d11 = open(11);
+    const auto d12 = open(12);
+    const auto query = [&](std::int16_t d, const char* text) {
+        bus.writeText(d, text);
+        EXPECT_EQ(bus.status(), 0) << text;
+        const std::string reply = read(d);
+        return bus.status() == (kErr | kTimo) ? "timeout" : reply.substr(0, reply.find('\n'));
+    };
+    // The silent generator times out on identification only; its queued error is there at once.
+    EXPECT_EQ(query(d11, "*IDN?\n"), "timeout");
+    EXPECT_EQ(trace.lines().back(), "BUS 11 timeout");
+    EXPECT_EQ(query(d11, ":SYST:ERR?\n"), "-222,\"Data out of range\"");
+    EXPECT_EQ(query(d11, ":SYST:ERR?\n"), "+0,\"No error\"");
+    for (const char* q : {"*IDN?\n", "*OPC?\n", ":SYST:ERR?\n"})
+        EXPECT_EQ(query(d12, q), "timeout");
+    // Writes still reach a timing-out generator.
+    bus.writeText(d12, ":OUTP1:STAT ON\n");
+    EXPECT_TRUE(generators[12]->state().outputs[0].on);
 }
 
 TEST(SimGpibBusUntraced, WorksWithoutTraceOrFaults) {
