@@ -4,13 +4,19 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <string>
+#include <utility>
+#include <vector>
 
+#include "instruments/error_capture.h"
 #include "instruments/instrument_error.h"
 #include "instruments/io_trace.h"
 #include "transport/transport_factory.h"
 
 namespace zp::transport {
 namespace {
+
+using testing_support::errorOf;
 
 constexpr std::uint16_t kErr = InstrumentBus::kStatusError;
 constexpr std::uint16_t kTimo = InstrumentBus::kStatusTimeout;
@@ -25,27 +31,16 @@ Fn hook(const char* name) {
     return fn;
 }
 
-TEST(GpibLibrary, MissingLibrariesAreNamedInTheError) {
-    try {
+TEST(GpibLibrary, LoadsTheFirstUsableCandidateOrNamesEveryFailure) {
+    const std::string missing = errorOf([] {
         GpibLibrary::load({"/nonexistent/libgpib.so.0", "libni4882-missing.so"});
-        FAIL();
-    } catch (const InstrumentError& e) {
-        EXPECT_NE(e.description().find("/nonexistent/libgpib.so.0"), std::string::npos);
-        EXPECT_NE(e.description().find("libni4882-missing.so"), std::string::npos);
-        EXPECT_NE(e.description().find("ZP_GPIB_LIBRARY"), std::string::npos);
+    });
+    for (const char* part :
+         {"/nonexistent/libgpib.so.0", "libni4882-missing.so", "ZP_GPIB_LIBRARY"}) {
+        EXPECT_NE(missing.find(part), std::string::npos) << missing;
     }
-}
-
-TEST(GpibLibrary, LibraryWithoutTheDriverFunctionsIsRefused) {
-    try {
-        GpibLibrary::load({ZP_FAKE_GPIB_INCOMPLETE});
-        FAIL();
-    } catch (const InstrumentError& e) {
-        EXPECT_NE(e.description().find("has no function"), std::string::npos) << e.description();
-    }
-}
-
-TEST(GpibLibrary, FallsThroughToTheFirstUsableCandidate) {
+    const std::string incomplete = errorOf([] { GpibLibrary::load({ZP_FAKE_GPIB_INCOMPLETE}); });
+    EXPECT_NE(incomplete.find("has no function"), std::string::npos) << incomplete;
     const auto library = GpibLibrary::load({"/nonexistent/libgpib.so.0", ZP_FAKE_GPIB_LIBRARY});
     EXPECT_EQ(library->path(), ZP_FAKE_GPIB_LIBRARY);
 }
@@ -113,38 +108,24 @@ TEST_F(GpibBusTest, ClearDropsThePendingReplyAndDevicesGoOfflineWithTheBus) {
     EXPECT_EQ(isOnline(107), 0);
 }
 
-TEST_F(GpibBusTest, BoardMissingIsAnInstrumentError) {
-    auto bus = makeTransportBus({{7, "GPIB3::7::INSTR"}}, nullptr);
-    try {
-        bus->openDevice(0, 7, 0, 13, 1, 0);
-        FAIL();
-    } catch (const InstrumentError& e) {
-        EXPECT_NE(e.description().find("GPIB3"), std::string::npos) << e.description();
-        EXPECT_NE(e.description().find("no GPIB board"), std::string::npos) << e.description();
-    }
-}
-
-TEST(GpibBusMissingDriver, OpenFailsWithTheLibraryNames) {
-    ::setenv("ZP_GPIB_LIBRARY", "/nonexistent/libgpib-test.so", 1);
-    auto bus = makeTransportBus({{7, "GPIB0::7::INSTR"}}, nullptr);
-    try {
-        bus->openDevice(0, 7, 0, 13, 1, 0);
-        FAIL();
-    } catch (const InstrumentError& e) {
-        EXPECT_NE(e.description().find("/nonexistent/libgpib-test.so"), std::string::npos);
-    }
-    ::unsetenv("ZP_GPIB_LIBRARY");
-}
-
-TEST(Vxi11, UnreachableGatewayFailsClearly) {
-    // Nothing answers RPC on the loopback port mapper here; the link must fail, not hang.
-    auto bus = makeTransportBus({{9, "TCPIP0::127.0.0.1::gpib0,9::INSTR"}}, nullptr);
-    try {
-        bus->openDevice(0, 9, 0, 11, 1, 0);
-        FAIL();
-    } catch (const InstrumentError& e) {
-        EXPECT_NE(e.description().find("gpib0,9 at 127.0.0.1"), std::string::npos)
-            << e.description();
+TEST(GpibBusOpen, MissingBoardDriverOrGatewayFailsClearly) {
+    const auto openError = [](const std::string& resource, const char* library) {
+        ::setenv("ZP_GPIB_LIBRARY", library, 1);
+        auto bus = makeTransportBus({{7, resource}}, nullptr);
+        const std::string error = errorOf([&] { bus->openDevice(0, 7, 0, 11, 1, 0); });
+        ::unsetenv("ZP_GPIB_LIBRARY");
+        return error;
+    };
+    const std::pair<std::string, std::vector<const char*>> cases[] = {
+        {openError("GPIB3::7::INSTR", ZP_FAKE_GPIB_LIBRARY), {"GPIB3", "no GPIB board"}},
+        {openError("GPIB0::7::INSTR", "/nonexistent/libgpib-test.so"),
+         {"/nonexistent/libgpib-test.so"}},
+        // Nothing answers RPC on the loopback port mapper here; the link must fail, not hang.
+        {openError("TCPIP0::127.0.0.1::gpib0,9::INSTR", ZP_FAKE_GPIB_LIBRARY),
+         {"gpib0,9 at 127.0.0.1"}},
+    };
+    for (const auto& [error, parts] : cases) {
+        for (const char* part : parts) EXPECT_NE(error.find(part), std::string::npos) << error;
     }
 }
 

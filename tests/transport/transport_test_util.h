@@ -8,6 +8,7 @@
 
 #include "sim/scpi_server.h"
 #include "sim/sim_generator.h"
+#include "transport/raw_socket_link.h"
 
 namespace zp::testing {
 
@@ -38,6 +39,10 @@ struct LoopbackBench {
 
     std::string resource(int address) const {
         return "TCPIP0::127.0.0.1::" + std::to_string(server->port(address)) + "::SOCKET";
+    }
+    transport::RawSocketLink link(
+        int address, std::chrono::milliseconds timeout = std::chrono::seconds(2)) const {
+        return transport::RawSocketLink("127.0.0.1", server->port(address), timeout);
     }
 
     std::map<int, std::unique_ptr<sim::SimGenerator>> generators;
