@@ -37,6 +37,8 @@ void checkInstrumentError(InstrumentBus& bus, std::int16_t descriptor, int addre
     bus.writeText(descriptor, ":SYST:ERR?\n");
     std::string buffer(kReplyBufferSize, ' ');
     bus.readText(descriptor, buffer);
+    // A reply that never came is a bus failure, not a generator error made of blanks.
+    if (failed(bus)) failReading(address);
     if (buffer.rfind("+0", 0) != 0) {
         throw InstrumentError(kOwnCheckError, "Pulse Generator at address " +
                                                   std::to_string(address) +

@@ -88,18 +88,19 @@ TEST(GeneratorChecksTest, ErrorCheckPassesOnlyForPlusZeroAtTheStartAndQuotesTheR
     EXPECT_EQ(bus.buffers, (std::vector<std::string>{std::string(100, ' ')}));
 
     const std::string prefix = "Pulse Generator at address 12 generated the following error: ";
-    // A failed read leaves the hundred blanks in the buffer, and they are what is reported.
-    for (const std::optional<std::string>& reply :
-         {std::optional<std::string>("-222,\"Data out of range\"\n"),
-          std::optional<std::string>(" +0,\"No error\"\n"), std::optional<std::string>(""),
-          std::optional<std::string>()}) {
+    for (const std::string reply : {"-222,\"Data out of range\"\n", " +0,\"No error\"\n", ""}) {
         FakeBus failing;
         failing.replies.push_back(reply);
         long number = 0;
-        EXPECT_EQ(errorOf([&] { checkInstrumentError(failing, 7, 12); }, &number),
-                  prefix + reply.value_or(std::string(100, ' ')));
+        EXPECT_EQ(errorOf([&] { checkInstrumentError(failing, 7, 12); }, &number), prefix + reply);
         EXPECT_EQ(number, kOwnCheckError);
     }
+
+    // No reply at all (the read timed out) is a read failure, not an error made of blanks.
+    FakeBus silent;
+    silent.replies.push_back(std::nullopt);
+    EXPECT_EQ(errorOf([&] { checkInstrumentError(silent, 7, 12); }),
+              "Error reading from signal generator at address 12");
 }
 
 }  // namespace
