@@ -11,8 +11,6 @@ namespace zp::sim {
 
 namespace {
 
-constexpr double kDefaultPeriod = 1e-3;
-
 enum class Kind { TestReceiver, ReferenceReceiver, SParameter };
 
 struct Parameter {
@@ -36,30 +34,26 @@ std::optional<Parameter> parseParameter(std::string_view text, int ports) {
     return std::nullopt;
 }
 
-struct Signal {
-    PulseWindow window;
-    double period = kDefaultPeriod;
-};
-
 // Internal generator "PulseN" when the element routes one, else the wired external output.
-Signal signalOf(const SimChannel& ch, const std::string& element, int row, int point,
-                const GeneratorMap* generators, const Wiring& wiring) {
+PulseWindow signalOf(const SimChannel& ch, const std::string& element, int row, int point,
+                     const GeneratorMap* generators, const Wiring& wiring) {
     const auto it = ch.pathElements.find(element);
     if (it != ch.pathElements.end() && it->second.size() == 6 &&
         it->second.rfind("Pulse", 0) == 0 && it->second[5] >= '1' && it->second[5] <= '4') {
         const auto& g = ch.pulse.generators[static_cast<std::size_t>(it->second[5] - '0')];
-        if (!g.on) return {{}, ch.pulse.period};
-        return {{true, g.delay + point * g.delayStep, g.width}, ch.pulse.period};
+        // Wired inside with the right sense: on during [delay, delay + width).
+        PulseWindow window{.pulsed = g.on, .period = ch.pulse.period};
+        if (g.on) {
+            window.delay = g.delay + point * g.delayStep;
+            window.width = g.width;
+        }
+        return window;
     }
     if (generators == nullptr || row < 0 || row >= wiring.rowCount()) return {};
     const WiredOutput& wired = wiring.row(row);
     const auto gen = generators->find(wired.address);
     if (gen == generators->end() || gen->second == nullptr) return {};
-    const SimGeneratorState& state = gen->second->state();
-    const double period = state.frequency > 0.0 ? 1.0 / state.frequency : kDefaultPeriod;
-    const auto& out = state.outputs[static_cast<std::size_t>(wired.output == 2 ? 1 : 0)];
-    if (!out.on) return {{}, period};
-    return {{true, out.delay, out.width}, period};
+    return Wiring::inputWindow(gen->second->state(), wired.output);
 }
 
 }  // namespace
@@ -73,22 +67,22 @@ std::complex<double> SimAnalyzerState::measure(const SimChannel& ch, const std::
     const auto p = parseParameter(parameter, model_.ports);
     if (!p) throw analyzerError(kIllegalValue);
     const int sourcePort = p->kind == Kind::SParameter ? p->sourcePort : ch.sourcePort;
-    const Signal source = signalOf(ch, Wiring::kSourceElement, 0, point, generators_, wiring_);
+    const PulseWindow source = signalOf(ch, Wiring::kSourceElement, 0, point, generators_, wiring_);
 
     const auto test = [&](int port) {
         const std::string receiver(1, static_cast<char>('A' + port - 1));
-        const Signal gate =
+        const PulseWindow gate =
             signalOf(ch, Wiring::gateElement(receiver), Wiring::gateRow(receiver, model_.ports),
                      point, generators_, wiring_);
-        return device_.gatedResponse(port, sourcePort, gate.window, source.window, gate.period);
+        return device_.gatedResponse(port, sourcePort, gate, source);
     };
     const auto reference = [&](int port) {
         const std::string receiver = "R" + std::to_string(port);
-        const Signal gate =
+        const PulseWindow gate =
             signalOf(ch, Wiring::gateElement(receiver), Wiring::gateRow(receiver, model_.ports),
                      point, generators_, wiring_);
         const double leak = port == sourcePort ? 1.0 : 1e-3;
-        return device_.gatedIncident(leak, gate.window, source.window, gate.period, 10 + port);
+        return device_.gatedIncident(leak, gate, source, 10 + port);
     };
 
     switch (p->kind) {

@@ -28,6 +28,18 @@ void Wiring::setRow(int r, WiredOutput output) {
     rows_[static_cast<std::size_t>(r)] = output;
 }
 
+PulseWindow Wiring::inputWindow(const SimGeneratorState& generator, int output) {
+    PulseWindow window;
+    if (generator.frequency > 0.0) window.period = 1.0 / generator.frequency;
+    const auto& out = generator.outputs[static_cast<std::size_t>(output == 2 ? 1 : 0)];
+    if (!out.on) return window;
+    window.pulsed = true;
+    window.delay = out.delay;
+    window.width = out.width;
+    window.complement = !out.inverted;
+    return window;
+}
+
 int Wiring::gateRow(std::string_view receiver, int ports) {
     if (receiver == "A") return 1;
     if (receiver == "B") return 2;

@@ -1,10 +1,14 @@
 #pragma once
 // How the external generator outputs reach the analyzer: row 0 drives the source modulation, the
-// other rows the receiver IF gates (two-port A, B, R1, R2; four-port A, B, C, D, R).
+// other rows the receiver IF gates (two-port A, B, R1, R2; four-port A, B, C, D, R). The
+// analyzer's pulse inputs are active low: the pulse is on while the output sits at its low level.
 
 #include <string>
 #include <string_view>
 #include <vector>
+
+#include "sim/device_model.h"
+#include "sim/sim_generator.h"
 
 namespace zp::sim {
 
@@ -32,6 +36,12 @@ class Wiring {
     static std::string gateElement(std::string_view receiver) {
         return "IFGate" + std::string(receiver);
     }
+    // What an active-low input sees of output 1 or 2 of a generator: an inverted output is on
+    // during [delay, delay + width), a normal one during the rest of the period. An output that
+    // is off leaves the input idle, which the analyzer takes as "not pulsed" (gate open, source
+    // unmodulated), so a generator row left disabled never blanks its receiver.
+    static PulseWindow inputWindow(const SimGeneratorState& generator, int output);
+
     static constexpr const char* kSourceElement = "PulseModDrive";
 
   private:
