@@ -83,10 +83,10 @@ RunResult runProgram(const std::string& program, const std::vector<std::string>&
 }
 
 RunningProgram::RunningProgram(const std::string& program, const std::vector<std::string>& args,
-                               const Env& env) {
+                               const Env& env, bool mergeOut) {
     int errPipe[2];
     if (pipe(errPipe) != 0) throw std::runtime_error("pipe failed");
-    pid_ = spawn(program, args, env, -1, errPipe[1]);
+    pid_ = spawn(program, args, env, mergeOut ? errPipe[1] : -1, errPipe[1]);
     close(errPipe[1]);
     errFd_ = errPipe[0];
 }

@@ -26,8 +26,9 @@ RunResult runProgram(const std::string& program, const std::vector<std::string>&
 // A program left running; its stderr can be read while it runs. Killed at destruction.
 class RunningProgram {
   public:
+    // mergeOut: stdout goes to the same pipe as stderr, so waitForErr sees both.
     RunningProgram(const std::string& program, const std::vector<std::string>& args,
-                   const Env& env = {});
+                   const Env& env = {}, bool mergeOut = false);
     ~RunningProgram();
     RunningProgram(const RunningProgram&) = delete;
     RunningProgram& operator=(const RunningProgram&) = delete;
