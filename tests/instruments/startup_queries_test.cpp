@@ -7,14 +7,12 @@
 #include "instruments/analyzer_identity_query.h"
 #include "instruments/error_capture.h"
 #include "instruments/help_file_query.h"
-#include "instruments/probe_bench.h"
 #include "sim/sim_bench.h"
 
 namespace zp {
 namespace {
 
 using testing_support::errorOf;
-using testing_support::ProbeBench;
 
 TEST(ReadAnalyzerIdentity, CountsAndHardwareValueForListedModelsOnly) {
     const struct {
@@ -42,9 +40,6 @@ TEST(ReadAnalyzerIdentity, AnalyzerErrorsAreThrown) {
     faults.add("analyzer:Caps.portCount=-200 Execution error");
     sim::SimBench bench("kt622", faults);
     EXPECT_EQ(errorOf([&] { readAnalyzerIdentity(bench); }), "-200 Execution error");
-    ProbeBench unreachable;
-    unreachable.connectError.emplace(-5, "-5 No analyzer");
-    EXPECT_EQ(errorOf([&] { readAnalyzerIdentity(unreachable); }), "-5 No analyzer");
 }
 
 TEST(QueryHelpFile, FileWithoutQuotesOrTheAnalyzersError) {
