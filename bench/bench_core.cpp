@@ -46,7 +46,7 @@ void BM_DefaultSolveExternal(benchmark::State& state) {
 BENCHMARK(BM_DefaultSolveExternal);
 
 void BM_FillAtStartup(benchmark::State& state) {
-    const zp::AnalyzerIdentity id{"KT655A", "K71 M83 M84", 3, 4, "5.0"};
+    const zp::AnalyzerIdentity id{"KT655A", "K71 M83 M84", zp::Ports{4}, zp::Sources{3}, "5.0"};
     zp::PulsedModule module;
     for (auto _ : state) {
         zp::fillAtStartup(module, id);

@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "core/bool16.h"
@@ -13,12 +14,32 @@
 
 namespace zp {
 
-// What start-up learns from the analyzer before it fills the state.
+// Port and source counts as distinct types, so that the two can never change places silently.
+struct Ports {
+    explicit constexpr Ports(int n) : count(n) {}
+    int count;
+};
+struct Sources {
+    explicit constexpr Sources(int n) : count(n) {}
+    int count;
+};
+
+// What start-up learns from the analyzer before it fills the state. Built by name (members one by
+// one) or through the constructor; plain numbers in the place of Ports and Sources do not compile.
 struct AnalyzerIdentity {
+    AnalyzerIdentity() = default;
+    AnalyzerIdentity(std::string model, std::string options, Ports ports, Sources sources,
+                     std::string hardware)
+        : modelText(std::move(model)),
+          optionText(std::move(options)),
+          portCount(ports.count),
+          sourceCount(sources.count),
+          hardwareValue(std::move(hardware)) {}
+
     std::string modelText;
     std::string optionText;
-    int sourceCount = 0;
     int portCount = 0;
+    int sourceCount = 0;
     std::string hardwareValue;  // its number 5 selects the 100 MHz pulse clock
 };
 

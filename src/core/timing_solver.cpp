@@ -5,6 +5,7 @@
 #include <limits>
 #include <optional>
 #include <stdexcept>
+#include <utility>
 
 #include "core/numeric.h"
 
@@ -34,18 +35,19 @@ std::int32_t periodsPerReading(double prf, double ifbw) {
     return static_cast<std::int32_t>(std::max(1.0, roundHalfEven(prf / ifbw)));
 }
 
-struct InternalSolution {
+// The internal path on the pulse clock grid.
+struct ClockSolution {
     double prf = 0.0;
     double ifbw = 0.0;
     std::int32_t ticks = 0;  // pulse clock ticks per period
     std::int32_t periods = 0;
 };
 
-std::optional<InternalSolution> solveOnClock(double prf, double ifbw, double clock, bool fixedPrf) {
+std::optional<ClockSolution> solveOnClock(double prf, double ifbw, double clock, bool fixedPrf) {
     if (!prfInRange(prf) || !ifbwInRange(ifbw) || !std::isfinite(clock) || clock <= 0) {
         return std::nullopt;
     }
-    InternalSolution s;
+    ClockSolution s;
     s.periods = periodsPerReading(prf, ifbw);
     double ticks = 0.0;
     if (fixedPrf) {
@@ -65,77 +67,29 @@ std::optional<InternalSolution> solveOnClock(double prf, double ifbw, double clo
     return s;
 }
 
+// No solution: PRF 0, the desired IF bandwidth and clock kept, every further result zero.
+InternalSolution noInternalSolution(const InternalRequest& r) {
+    InternalSolution out;
+    out.ifbw = r.ifbw;
+    out.pulseClockHz = r.pulseClockHz;
+    return out;
+}
+
+InternalSolution internalSolution(const InternalRequest& r, const ClockSolution& s) {
+    InternalSolution out;
+    out.prf = s.prf;
+    out.ifbw = s.ifbw;
+    out.pulseClockHz = r.pulseClockHz;
+    out.time1 = s.prf / s.periods;  // readings per second
+    out.time2 = s.ifbw;
+    out.list1 = {s.periods, 1};  // boxcar over N periods as (taps, weight)
+    out.list2 = {1, 1};          // unity second stage
+    out.list3 = {s.ticks, s.periods};
+    return out;
+}
+
 class DefaultSolver final : public TimingSolver {
   public:
-    // `decade` and `flag` are not needed by this model: N follows from PRF / IFBW directly.
-    void SolveExternal(double& prf, std::int32_t& ifCount, std::int32_t& ifbwHz, double& freqOffset,
-                       double& converterDelay, std::int16_t, Bool16 fixedPrf, Bool16) override {
-        // Synchronous detection needs no receiver offset; the converter delay is taken up by the
-        // analyzer's IF timing (setIfTimeA), not by the frequency.
-        freqOffset = 0.0;
-        const double ifbw = ifbwHz;
-        if (!prfInRange(prf) || !ifbwInRange(ifbw) || !std::isfinite(converterDelay) ||
-            converterDelay < 0) {
-            return noSolution(prf, ifCount);
-        }
-        const std::int32_t n = periodsPerReading(prf, ifbw);
-        if (isTrue(fixedPrf)) {
-            const double newIfbw = roundHalfEven(prf / n);
-            if (!ifbwInRange(newIfbw)) return noSolution(prf, ifCount);
-            ifbwHz = static_cast<std::int32_t>(newIfbw);
-        } else {
-            const double newPrf = n * ifbw;
-            if (!prfInRange(newPrf)) return noSolution(prf, ifCount);
-            prf = newPrf;
-        }
-        ifCount = n;
-    }
-
-    void SolveInternal(double& prf, double& ifbw, double& time2, double& time1,
-                       double& pulseClockHz, std::vector<std::int32_t>& list1,
-                       std::vector<std::int32_t>& list2, std::vector<std::int32_t>& list3,
-                       Bool16 fixedPrf) override {
-        const auto s = solveOnClock(prf, ifbw, pulseClockHz, isTrue(fixedPrf));
-        if (!s) {
-            prf = 0.0;
-            clearInternal(time2, time1, list1, list2, list3);
-            return;
-        }
-        writeInternal(*s, prf, ifbw, time2, time1, list1, list2, list3);
-    }
-
-    void SolveInternalGated(double& prf, double& ifbw, double& time2, double& time1,
-                            double& pulseClockHz, std::vector<std::int32_t>& list1,
-                            std::vector<std::int32_t>& list2, std::vector<std::int32_t>& list3,
-                            Bool16 fixedPrf, double highestGateDelay, double widestGateWidth,
-                            double& gatedTime1, double& gatedTime2,
-                            std::int32_t& gatedTicks) override {
-        auto s = solveOnClock(prf, ifbw, pulseClockHz, isTrue(fixedPrf));
-        double ticks = 0.0;
-        if (s) {
-            const bool gateOk = std::isfinite(highestGateDelay) && highestGateDelay >= 0 &&
-                                std::isfinite(widestGateWidth) && widestGateWidth > 0;
-            // The software window must close within the pulse period it integrates.
-            if (!gateOk || highestGateDelay + widestGateWidth > 1.0 / s->prf) s.reset();
-        }
-        if (s) {
-            ticks = std::max(1.0, roundHalfEven(widestGateWidth * pulseClockHz));
-            if (ticks > kMaxInt32) s.reset();
-        }
-        if (!s) {
-            prf = 0.0;
-            clearInternal(time2, time1, list1, list2, list3);
-            gatedTime1 = 0.0;
-            gatedTime2 = 0.0;
-            gatedTicks = 0;
-            return;
-        }
-        writeInternal(*s, prf, ifbw, time2, time1, list1, list2, list3);
-        gatedTime1 = highestGateDelay;
-        gatedTime2 = widestGateWidth;
-        gatedTicks = static_cast<std::int32_t>(ticks);
-    }
-
     // The narrowband attenuator setting for a receiver on "Auto": the pulsed IF level is
     // 20 log10(duty cycle) below the CW level, so less attenuation is needed the narrower the
     // gate. The result is the nearest of the three gain-table settings 30, 15 and 0 dB.
@@ -156,34 +110,111 @@ class DefaultSolver final : public TimingSolver {
     }
 
   private:
-    static void noSolution(double& prf, std::int32_t& ifCount) {
-        prf = 0.0;
-        ifCount = 0;
+    // `decade` and `flag` are not needed by this model: N follows from PRF / IFBW directly.
+    // Synchronous detection needs no receiver offset; the converter delay is taken up by the
+    // analyzer's IF timing (setIfTimeA), not by the frequency.
+    ExternalSolution external(const ExternalRequest& r) override {
+        ExternalSolution out;
+        out.ifbwHz = r.ifbwHz;
+        out.converterDelay = r.converterDelay;
+        const double ifbw = r.ifbwHz;
+        if (!prfInRange(r.prf) || !ifbwInRange(ifbw) || !std::isfinite(r.converterDelay) ||
+            r.converterDelay < 0) {
+            return out;
+        }
+        const std::int32_t n = periodsPerReading(r.prf, ifbw);
+        out.prf = r.prf;
+        if (isTrue(r.fixedPrf)) {
+            const double newIfbw = roundHalfEven(r.prf / n);
+            if (!ifbwInRange(newIfbw)) return noExternalSolution(out);
+            out.ifbwHz = static_cast<std::int32_t>(newIfbw);
+        } else {
+            out.prf = n * ifbw;
+            if (!prfInRange(out.prf)) return noExternalSolution(out);
+        }
+        out.ifCount = n;
+        return out;
     }
 
-    static void clearInternal(double& time2, double& time1, std::vector<std::int32_t>& list1,
-                              std::vector<std::int32_t>& list2, std::vector<std::int32_t>& list3) {
-        time1 = 0.0;
-        time2 = 0.0;
-        list1.clear();
-        list2.clear();
-        list3.clear();
+    InternalSolution internal(const InternalRequest& r) override {
+        const auto s = solveOnClock(r.prf, r.ifbw, r.pulseClockHz, isTrue(r.fixedPrf));
+        return s ? internalSolution(r, *s) : noInternalSolution(r);
     }
 
-    static void writeInternal(const InternalSolution& s, double& prf, double& ifbw, double& time2,
-                              double& time1, std::vector<std::int32_t>& list1,
-                              std::vector<std::int32_t>& list2, std::vector<std::int32_t>& list3) {
-        prf = s.prf;
-        ifbw = s.ifbw;
-        time1 = s.prf / s.periods;  // readings per second
-        time2 = s.ifbw;
-        list1 = {s.periods, 1};  // boxcar over N periods as (taps, weight)
-        list2 = {1, 1};          // unity second stage
-        list3 = {s.ticks, s.periods};
+    InternalSolution internalGated(const InternalRequest& r, const GateWindow& gate) override {
+        const auto s = solveOnClock(r.prf, r.ifbw, r.pulseClockHz, isTrue(r.fixedPrf));
+        if (!s) return noInternalSolution(r);
+        const double delay = gate.highestGateDelay;
+        const double width = gate.widestGateWidth;
+        const bool gateOk = std::isfinite(delay) && delay >= 0 && std::isfinite(width) && width > 0;
+        // The software window must close within the pulse period it integrates.
+        if (!gateOk || delay + width > 1.0 / s->prf) return noInternalSolution(r);
+        const double ticks = std::max(1.0, roundHalfEven(width * r.pulseClockHz));
+        if (ticks > kMaxInt32) return noInternalSolution(r);
+        InternalSolution out = internalSolution(r, *s);
+        out.gate = {delay, width, static_cast<std::int32_t>(ticks)};
+        return out;
+    }
+
+    static ExternalSolution noExternalSolution(ExternalSolution out) {
+        out.prf = 0.0;
+        out.ifCount = 0;
+        return out;
     }
 };
 
 }  // namespace
+
+void TimingSolver::SolveExternal(double& prf, std::int32_t& ifCount, std::int32_t& ifbwHz,
+                                 double& freqOffset, double& converterDelay, std::int16_t decade,
+                                 Bool16 fixedPrf, Bool16 flag) {
+    const ExternalSolution s = external({prf, ifbwHz, converterDelay, decade, fixedPrf, flag});
+    prf = s.prf;
+    ifCount = s.ifCount;
+    ifbwHz = s.ifbwHz;
+    freqOffset = s.freqOffset;
+    converterDelay = s.converterDelay;
+}
+
+namespace {
+
+void writeInternal(InternalSolution&& s, double& prf, double& ifbw, double& time2, double& time1,
+                   double& pulseClockHz, std::vector<std::int32_t>& list1,
+                   std::vector<std::int32_t>& list2, std::vector<std::int32_t>& list3) {
+    prf = s.prf;
+    ifbw = s.ifbw;
+    time2 = s.time2;
+    time1 = s.time1;
+    pulseClockHz = s.pulseClockHz;
+    list1 = std::move(s.list1);
+    list2 = std::move(s.list2);
+    list3 = std::move(s.list3);
+}
+
+}  // namespace
+
+void TimingSolver::SolveInternal(double& prf, double& ifbw, double& time2, double& time1,
+                                 double& pulseClockHz, std::vector<std::int32_t>& list1,
+                                 std::vector<std::int32_t>& list2, std::vector<std::int32_t>& list3,
+                                 Bool16 fixedPrf) {
+    writeInternal(internal({prf, ifbw, pulseClockHz, fixedPrf}), prf, ifbw, time2, time1,
+                  pulseClockHz, list1, list2, list3);
+}
+
+void TimingSolver::SolveInternalGated(double& prf, double& ifbw, double& time2, double& time1,
+                                      double& pulseClockHz, std::vector<std::int32_t>& list1,
+                                      std::vector<std::int32_t>& list2,
+                                      std::vector<std::int32_t>& list3, Bool16 fixedPrf,
+                                      double highestGateDelay, double widestGateWidth,
+                                      double& gatedTime1, double& gatedTime2,
+                                      std::int32_t& gatedTicks) {
+    InternalSolution s =
+        internalGated({prf, ifbw, pulseClockHz, fixedPrf}, {highestGateDelay, widestGateWidth});
+    gatedTime1 = s.gate.time1;
+    gatedTime2 = s.gate.time2;
+    gatedTicks = s.gate.ticks;
+    writeInternal(std::move(s), prf, ifbw, time2, time1, pulseClockHz, list1, list2, list3);
+}
 
 std::unique_ptr<TimingSolver> makeDefaultSolver() {
     return std::make_unique<DefaultSolver>();

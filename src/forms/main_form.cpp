@@ -7,7 +7,8 @@
 #include <utility>
 
 #include "forms/main_form_layout.h"
-#include "instruments/instrument_error.h"
+#include "instruments/analyzer_identity_query.h"
+#include "instruments/help_file_query.h"
 
 namespace zp {
 
@@ -42,21 +43,6 @@ std::string rowName(const char* base, int row) {
 Geometry shiftedDown(Geometry g, int by) {
     g.top += by;
     return g;
-}
-
-// What start-up learns from the analyzer; counts and the hardware value only for listed models.
-AnalyzerIdentity readIdentity(AnalyzerApplication& app) {
-    AnalyzerIdentity id;
-    id.modelText = app.modelText();
-    id.optionText = app.optionText();
-    std::unique_ptr<AnalyzerCaps> caps = app.hardwareInfo();
-    if (!caps) throw InstrumentError(kOwnCheckError, "The analyzer reports no capability object.");
-    if (isListedModelText(id.modelText)) {
-        id.sourceCount = caps->sourceCount();
-        id.portCount = caps->portCount();
-        id.hardwareValue = caps->hardwareValue();
-    }
-    return id;
 }
 
 }  // namespace
@@ -185,11 +171,7 @@ int MainForm::ruleRows() const {
 void MainForm::Form_Load() {
     // Everything the analyzer can fail on happens before the state or a control is touched.
     PulsedModule filled = state_;
-    {
-        std::unique_ptr<AnalyzerApplication> app = bench_.connectAnalyzer();
-        if (!app) throw InstrumentError(kOwnCheckError, "The analyzer cannot be reached.");
-        fillAtStartup(filled, readIdentity(*app));
-    }
+    fillAtStartup(filled, readAnalyzerIdentity(bench_));
     state_ = std::move(filled);
 
     buildControls();
@@ -284,19 +266,12 @@ void MainForm::m_NoPG_Click() {
 // ---- Help.
 
 void MainForm::m_contents_Click() {
-    std::string file;
-    try {
-        std::unique_ptr<AnalyzerApplication> app = bench_.connectAnalyzer();
-        if (!app) throw InstrumentError(kOwnCheckError, "The analyzer cannot be reached.");
-        std::unique_ptr<CommandParser> parser = app->commandParser();
-        if (!parser) throw InstrumentError(kOwnCheckError, "The analyzer has no command parser.");
-        file = parser->parse("DIAG:HELP:FILE?");
-    } catch (const std::exception& e) {
-        ui_.message(e.what());
+    const HelpFileQuery help = queryHelpFile(bench_);
+    if (help.error) {
+        ui_.message(*help.error);
         return;
     }
-    std::erase_if(file, [](char c) { return c == '"' || c == '\n' || c == '\r'; });
-    ui_.showHelp(file, kHelpTopic);
+    ui_.showHelp(help.file, kHelpTopic);
 }
 
 }  // namespace zp

@@ -3,6 +3,7 @@
 #include <cmath>
 #include <functional>
 #include <stdexcept>
+#include <utility>
 
 #include "core/numeric.h"
 #include "forms/main_form.h"
@@ -90,49 +91,73 @@ void MainForm::b_calculate_Click() {
 }
 
 void MainForm::calculateSolution(double desiredPrf) {
-    // The solver writes into the state as it goes; a failure puts every field back.
-    const PulsedModule saved = state_;
+    // The solution is worked out on its own and written into the state only once the solver has
+    // answered with a usable PRF; a failure leaves every field as it was.
     std::unique_ptr<TimingSolver> solver;
     const auto useSolver = [&]() -> TimingSolver& {
         if (!solver && solverFactory_) solver = solverFactory_();
         if (!solver) throw std::runtime_error("The timing solver is not available.");
         return *solver;
     };
+    const auto checkPrf = [](double prf) {
+        if (!std::isfinite(prf) || prf < 0.0)
+            throw std::runtime_error("The timing solver gave an invalid PRF (" + generalText(prf) +
+                                     " Hz).");
+    };
     PulsedModule& s = state_;
     try {
-        s.PRF = VexoEdit_prf.value();
+        const double prf = VexoEdit_prf.value();
         if (isTrue(s.IsListedModel) && s.UseInternalPG != kUnchecked) {
-            s.IFBW = VexoEdit_IFBW.value();
-            s.PulseClockHz = isTrue(s.HasClock100MHz) ? kClock100MHz : kClock60MHz;
-            if (m_NoSWGating.checked) {
-                useSolver().SolveInternal(s.PRF, s.IFBW, s.IntSolveTime2, s.IntSolveTime1,
-                                          s.PulseClockHz, s.IntSolveList1, s.IntSolveList2,
-                                          s.IntSolveList3, s.FixedPRF);
+            const InternalRequest request{
+                .prf = prf,
+                .ifbw = VexoEdit_IFBW.value(),
+                .pulseClockHz = isTrue(s.HasClock100MHz) ? kClock100MHz : kClock60MHz,
+                .fixedPrf = s.FixedPRF};
+            const bool gated = !m_NoSWGating.checked;
+            InternalSolution solution;
+            if (gated) {
+                const GateWindow gate{.highestGateDelay = FHighestGateDelay(),
+                                      .widestGateWidth = FMaxGateWidth()};
+                solution = useSolver().SolveInternalGated(request, gate);
             } else {
-                const double highestDelay = FHighestGateDelay();
-                const double widestWidth = FMaxGateWidth();
-                useSolver().SolveInternalGated(
-                    s.PRF, s.IFBW, s.IntSolveTime2, s.IntSolveTime1, s.PulseClockHz,
-                    s.IntSolveList1, s.IntSolveList2, s.IntSolveList3, s.FixedPRF, highestDelay,
-                    widestWidth, s.GatedSolveTime1, s.GatedSolveTime2, s.GatedSolveTicks);
+                solution = useSolver().SolveInternal(request);
             }
-            s.IFBWHz = toInt32(s.IFBW);
+            const std::int32_t ifbwHz = toInt32(solution.ifbw);
+            checkPrf(solution.prf);
+            s.PRF = solution.prf;
+            s.IFBW = solution.ifbw;
+            s.PulseClockHz = solution.pulseClockHz;
+            s.IntSolveTime1 = solution.time1;
+            s.IntSolveTime2 = solution.time2;
+            s.IntSolveList1 = std::move(solution.list1);
+            s.IntSolveList2 = std::move(solution.list2);
+            s.IntSolveList3 = std::move(solution.list3);
+            if (gated) {
+                s.GatedSolveTime1 = solution.gate.time1;
+                s.GatedSolveTime2 = solution.gate.time2;
+                s.GatedSolveTicks = solution.gate.ticks;
+            }
+            s.IFBWHz = ifbwHz;
         } else {
-            const auto decade = static_cast<std::int16_t>(std::floor(FLog10(s.PRF)) - 3);
-            s.IFBWHz = toInt32(VexoEdit_IFBW.value());
-            s.ConverterDelay = m_ConverterMeas.checked ? kConverterDelay : 0.0;
-            useSolver().SolveExternal(s.PRF, s.SolvedIFCount, s.IFBWHz, s.SolvedFreqOffset,
-                                      s.ConverterDelay, decade, s.FixedPRF, kTrue);
+            const ExternalRequest request{
+                .prf = prf,
+                .ifbwHz = toInt32(VexoEdit_IFBW.value()),
+                .converterDelay = m_ConverterMeas.checked ? kConverterDelay : 0.0,
+                .decade = static_cast<std::int16_t>(std::floor(FLog10(prf)) - 3),
+                .fixedPrf = s.FixedPRF,
+                .flag = kTrue};
+            const ExternalSolution solution = useSolver().SolveExternal(request);
+            checkPrf(solution.prf);
+            s.PRF = solution.prf;
+            s.SolvedIFCount = solution.ifCount;
+            s.IFBWHz = solution.ifbwHz;
+            s.SolvedFreqOffset = solution.freqOffset;
+            s.ConverterDelay = solution.converterDelay;
         }
-        if (!std::isfinite(s.PRF) || s.PRF < 0.0)
-            throw std::runtime_error("The timing solver gave an invalid PRF (" +
-                                     generalText(s.PRF) + " Hz).");
     } catch (const std::exception& e) {
-        state_ = saved;
         ui_.message(e.what());
         return;
     } catch (...) {
-        state_ = saved;
         ui_.message("The timing solver failed.");
         return;
     }

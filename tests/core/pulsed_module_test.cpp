@@ -11,6 +11,20 @@ namespace {
 using Names = std::vector<std::string>;
 using Values = std::vector<std::int16_t>;
 
+// Port and source counts only go in as Ports and Sources, in that order.
+template <class P, class S>
+constexpr bool identityFrom = requires(P p, S s) {
+    AnalyzerIdentity{"", "", p, s, ""};
+};
+template <class T>
+constexpr bool identityFromBracedNumbers = requires {
+    T{"", "", {2}, {1}, ""};
+};
+static_assert(identityFrom<Ports, Sources>);
+static_assert(!identityFrom<Sources, Ports>);
+static_assert(!identityFrom<int, int>);
+static_assert(!identityFromBracedNumbers<AnalyzerIdentity>);
+
 PulsedModule filled(const AnalyzerIdentity& id) {
     PulsedModule s;
     fillAtStartup(s, id);
@@ -18,7 +32,7 @@ PulsedModule filled(const AnalyzerIdentity& id) {
 }
 
 TEST(FillAtStartup, TwoPortOneSourceListedModel) {
-    const auto s = filled({"KT622A", "K71 M81", 1, 2, "5"});
+    const auto s = filled({"KT622A", "K71 M81", Ports{2}, Sources{1}, "5"});
     EXPECT_EQ(s.IsListedModel, kTrue);
     EXPECT_EQ(s.Is2Port1Src, kTrue);
     EXPECT_EQ(s.Is4PortMultiSrc, kFalse);
@@ -59,7 +73,7 @@ TEST(FillAtStartup, TwoPortOneSourceListedModel) {
 }
 
 TEST(FillAtStartup, FourPortThreeSources) {
-    const auto s = filled({"KT655A", "K71 M83 M84", 3, 4, "5.0"});
+    const auto s = filled({"KT655A", "K71 M83 M84", Ports{4}, Sources{3}, "5.0"});
     EXPECT_EQ(s.Is4PortMultiSrc, kTrue);
     EXPECT_EQ(s.Is4Port1Src, kFalse);
     EXPECT_EQ(s.HasClock100MHz, kTrue);  // "5.0" counts as 5
@@ -75,7 +89,7 @@ TEST(FillAtStartup, FourPortThreeSources) {
 }
 
 TEST(FillAtStartup, UnlistedModels) {
-    auto s = filled({"ZX20", "J55", 1, 2, "5"});
+    auto s = filled({"ZX20", "J55", Ports{2}, Sources{1}, "5"});
     EXPECT_EQ(s.IsListedModel, kFalse);
     EXPECT_EQ(s.HasInternalGates, kTrue);
     EXPECT_TRUE(s.internalGatesAvailable());
@@ -86,7 +100,7 @@ TEST(FillAtStartup, UnlistedModels) {
     EXPECT_TRUE(s.OutputNames.empty() && s.RxPathNames.empty() && s.RxSolveValues.empty());
     EXPECT_EQ(s.ReceiverGains.size(), 4u);
 
-    s = filled({"ZX20", "", 2, 4, "5"});
+    s = filled({"ZX20", "", Ports{4}, Sources{2}, "5"});
     EXPECT_FALSE(s.internalGatesAvailable());
     EXPECT_EQ(s.Is4PortMultiSrc, kFalse);  // port flags only for listed models
     EXPECT_EQ(s.NumOutputs, 5);
@@ -94,7 +108,7 @@ TEST(FillAtStartup, UnlistedModels) {
 }
 
 TEST(FillAtStartup, ListedModelOddCountsAndHardwareValues) {
-    auto s = filled({"kt633a", "k72 m82", 3, 2, "abc"});
+    auto s = filled({"kt633a", "k72 m82", Ports{2}, Sources{3}, "abc"});
     EXPECT_EQ(s.IsListedModel, kTrue);  // letter case ignored
     EXPECT_FALSE(s.hasKnownLayout());
     EXPECT_EQ(s.HasClock100MHz, kFalse);
@@ -102,14 +116,14 @@ TEST(FillAtStartup, ListedModelOddCountsAndHardwareValues) {
     EXPECT_EQ(s.HasModSource2, kTrue);
     EXPECT_TRUE(s.OutputNames.empty());
 
-    s = filled({"KT611", "", 1, 4, " 4.9 "});
+    s = filled({"KT611", "", Ports{4}, Sources{1}, " 4.9 "});
     EXPECT_EQ(s.Is4Port1Src, kTrue);
     EXPECT_EQ(s.HasClock100MHz, kFalse);
     EXPECT_EQ(s.NumOutputs, 6);
     // A later fill starts from scratch.
     s.PRF = 1234.0;
     s.FixedPRF = kFalse;
-    fillAtStartup(s, {"ZX20", "", 1, 2, "5"});
+    fillAtStartup(s, {"ZX20", "", Ports{2}, Sources{1}, "5"});
     EXPECT_EQ(s.PRF, 0.0);
     EXPECT_EQ(s.FixedPRF, kTrue);
     EXPECT_EQ(s.Is4Port1Src, kFalse);

@@ -151,67 +151,85 @@ class RecordingSolver : public TimingSolver {
   public:
     explicit RecordingSolver(SolverScript& s) : s_(s) {}
 
-    void SolveExternal(double& prf, std::int32_t& ifCount, std::int32_t& ifbwHz, double& freqOffset,
-                       double& converterDelay, std::int16_t decade, Bool16 fixedPrf,
-                       Bool16 flag) override {
-        s_.calls.push_back("SolveExternal");
-        s_.desiredPrf = prf;
-        s_.ifbwHzIn = ifbwHz;
-        s_.converterDelay = converterDelay;
-        s_.decade = decade;
-        s_.fixedPrf = fixedPrf;
-        s_.flag = flag;
-        ifCount = 7;
-        freqOffset = 123.0;
-        answer(prf);
-        if (s_.ifbw) ifbwHz = static_cast<std::int32_t>(*s_.ifbw);
-    }
-
-    void SolveInternal(double& prf, double& ifbw, double& time2, double& time1,
-                       double& pulseClockHz, std::vector<std::int32_t>& list1,
-                       std::vector<std::int32_t>&, std::vector<std::int32_t>&,
-                       Bool16 fixedPrf) override {
-        internal("SolveInternal", prf, ifbw, time2, time1, pulseClockHz, list1, fixedPrf,
-                 {1, 2, 3});
-    }
-
-    void SolveInternalGated(double& prf, double& ifbw, double& time2, double& time1,
-                            double& pulseClockHz, std::vector<std::int32_t>& list1,
-                            std::vector<std::int32_t>&, std::vector<std::int32_t>&, Bool16 fixedPrf,
-                            double highestGateDelay, double widestGateWidth, double& gatedTime1,
-                            double&, std::int32_t& gatedTicks) override {
-        s_.highestGateDelay = highestGateDelay;
-        s_.widestGateWidth = widestGateWidth;
-        gatedTime1 = highestGateDelay;
-        gatedTicks = 42;
-        internal("SolveInternalGated", prf, ifbw, time2, time1, pulseClockHz, list1, fixedPrf,
-                 {4, 5});
-    }
-
     void SolveReceiver(double, double, std::int16_t& rxValue) override { rxValue = 0; }
 
   private:
-    void internal(const char* name, double& prf, double& ifbw, double& time2, double& time1,
-                  double clock, std::vector<std::int32_t>& list1, Bool16 fixedPrf,
-                  std::vector<std::int32_t> answerList) {
-        s_.calls.push_back(name);
-        s_.desiredPrf = prf;
-        s_.ifbwIn = ifbw;
-        s_.pulseClockHz = clock;
-        s_.fixedPrf = fixedPrf;
-        time1 = 1.0;
-        time2 = 2.0;
-        list1 = std::move(answerList);
-        answer(prf);
-        if (s_.ifbw) ifbw = *s_.ifbw;
+    ExternalSolution external(const ExternalRequest& r) override {
+        s_.calls.push_back("SolveExternal");
+        s_.desiredPrf = r.prf;
+        s_.ifbwHzIn = r.ifbwHz;
+        s_.converterDelay = r.converterDelay;
+        s_.decade = r.decade;
+        s_.fixedPrf = r.fixedPrf;
+        s_.flag = r.flag;
+        ExternalSolution out{r.prf, 7, r.ifbwHz, 123.0, r.converterDelay};
+        answer(out.prf);
+        if (s_.ifbw) out.ifbwHz = static_cast<std::int32_t>(*s_.ifbw);
+        return out;
     }
-    // Results are written before a scripted error, so that a restore has something to undo.
+
+    InternalSolution internal(const InternalRequest& r) override {
+        return recordInternal("SolveInternal", r, {1, 2, 3});
+    }
+
+    InternalSolution internalGated(const InternalRequest& r, const GateWindow& gate) override {
+        s_.highestGateDelay = gate.highestGateDelay;
+        s_.widestGateWidth = gate.widestGateWidth;
+        InternalSolution out = recordInternal("SolveInternalGated", r, {4, 5});
+        out.gate.time1 = gate.highestGateDelay;
+        out.gate.ticks = 42;
+        return out;
+    }
+
+    InternalSolution recordInternal(const char* name, const InternalRequest& r,
+                                    std::vector<std::int32_t> answerList) {
+        s_.calls.push_back(name);
+        s_.desiredPrf = r.prf;
+        s_.ifbwIn = r.ifbw;
+        s_.pulseClockHz = r.pulseClockHz;
+        s_.fixedPrf = r.fixedPrf;
+        InternalSolution out;
+        out.prf = r.prf;
+        out.ifbw = r.ifbw;
+        out.pulseClockHz = r.pulseClockHz;
+        out.time1 = 1.0;
+        out.time2 = 2.0;
+        out.list1 = std::move(answerList);
+        answer(out.prf);
+        if (s_.ifbw) out.ifbw = *s_.ifbw;
+        return out;
+    }
     void answer(double& prf) {
         if (s_.prf) prf = *s_.prf;
         if (s_.error) throw std::runtime_error(*s_.error);
     }
     SolverScript& s_;
 };
+
+// Keeps the desired timing and zeroes the rest: a solver for tests that do not calculate.
+class PassThroughSolver final : public TimingSolver {
+  public:
+    void SolveReceiver(double, double, std::int16_t& rxValue) override { rxValue = 0; }
+
+  private:
+    ExternalSolution external(const ExternalRequest& r) override {
+        return {r.prf, 0, r.ifbwHz, 0.0, r.converterDelay};
+    }
+    InternalSolution internal(const InternalRequest& r) override {
+        InternalSolution out;
+        out.prf = r.prf;
+        out.ifbw = r.ifbw;
+        out.pulseClockHz = r.pulseClockHz;
+        return out;
+    }
+    InternalSolution internalGated(const InternalRequest& r, const GateWindow&) override {
+        return internal(r);
+    }
+};
+
+inline std::unique_ptr<TimingSolver> makePassThroughSolver() {
+    return std::make_unique<PassThroughSolver>();
+}
 
 inline std::function<std::unique_ptr<TimingSolver>()> recordingFactory(SolverScript& s) {
     return [&s]() -> std::unique_ptr<TimingSolver> {
