@@ -4,8 +4,9 @@
 #include <gtest/gtest.h>
 
 #include <charconv>
-#include <cstring>
+#include <chrono>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "child_process.h"
@@ -19,15 +20,29 @@ using namespace std::chrono_literals;
 const std::string kSim = ZP_SIM_PATH;
 constexpr const char* kServing = "zentra-pulse-sim: serving 11 on 127.0.0.1:";
 
-// The port named by the first line, 0 when the line is not the expected one.
-int announcedPort(RunningProgram& sim) {
-    if (!sim.waitForErr("\n", 10s)) return 0;
+// The ports named by the first line, which must be `lead` and then a port, followed by ", " and
+// `host:port` entries; empty when the line is not of that form.
+std::vector<int> announcedPorts(RunningProgram& sim, const std::string& lead = kServing,
+                                const std::string& next = "") {
+    if (!sim.waitForErr("\n", 10s)) return {};
     const std::string& out = sim.err();
-    if (out.rfind(kServing, 0) != 0) return 0;
-    int port = 0;
-    const char* first = out.data() + std::strlen(kServing);
-    const auto [end, ec] = std::from_chars(first, out.data() + out.size(), port);
-    return ec == std::errc{} && *end == '\n' ? port : 0;
+    if (out.rfind(lead, 0) != 0) return {};
+    std::vector<int> ports;
+    const char* at = out.data() + lead.size();
+    while (true) {
+        int port = 0;
+        const auto [end, ec] = std::from_chars(at, out.data() + out.size(), port);
+        if (ec != std::errc{}) return {};
+        ports.push_back(port);
+        if (*end == '\n') return ports;
+        if (next.empty() || std::string_view(end).rfind(next, 0) != 0) return {};
+        at = end + next.size();
+    }
+}
+
+int announcedPort(RunningProgram& sim) {
+    const auto ports = announcedPorts(sim);
+    return ports.size() == 1 ? ports.front() : 0;
 }
 
 TEST(SimServerProgram, PortZeroServesAFreePortUntilSigterm) {
@@ -55,6 +70,51 @@ TEST(SimServerProgram, PortZeroServesAFreePortUntilSigterm) {
     EXPECT_TRUE(sim.waitForErr("zentra-pulse-sim: stopped\n", 2s)) << sim.err();
 }
 
+TEST(SimServerProgram, EntriesSplitOnBlanksAndAnIPv6PortIsBracketed) {
+    RunningProgram two(kSim, {"--serve", "11=0 \t12=0"}, {}, true);
+    const auto ports = announcedPorts(two, kServing, ", 12 on 127.0.0.1:");
+    ASSERT_EQ(ports.size(), 2u) << two.err();
+    transport::RawSocketLink link("127.0.0.1", ports[1], 5s);
+    link.write("*IDN?\n");
+    EXPECT_EQ(link.read(256), "Veltrix,PG8102A,SIM12,1.0\n");
+
+    RunningProgram v6(kSim, {"--serve", "11=0", "--bind", "::1"}, {}, true);
+    const auto v6Ports = announcedPorts(v6, "zentra-pulse-sim: serving 11 on [::1]:");
+    if (v6Ports.empty() && v6.err().find("Cannot listen") != std::string::npos) {
+        GTEST_SKIP() << "no IPv6 loopback: " << v6.err();
+    }
+    ASSERT_EQ(v6Ports.size(), 1u) << v6.err();
+    transport::RawSocketLink link6("::1", v6Ports[0], 5s);
+    link6.write("*OPC?\n");
+    EXPECT_EQ(link6.read(16), "1\n");
+}
+
+TEST(SimServerProgram, IdleTimeoutClosesASilentClient) {
+    RunningProgram sim(kSim, {"--idle-timeout", "1", "--serve", "11=0"}, {}, true);
+    const int port = announcedPort(sim);
+    ASSERT_GT(port, 0) << sim.err();
+    const auto start = std::chrono::steady_clock::now();
+    transport::RawSocketLink link("127.0.0.1", port, 5s);
+    try {
+        link.read(16);
+        ADD_FAILURE() << "read something";
+    } catch (const transport::LinkFailure& e) {
+        EXPECT_FALSE(e.timedOut()) << e.what();
+    }
+    const auto closed = std::chrono::steady_clock::now() - start;
+    EXPECT_GE(closed, 1s);
+    EXPECT_LT(closed, 3s);
+}
+
+TEST(SimServerProgram, UsageNamesEveryOption) {
+    const RunResult help = runProgram(kSim, {"--help"});
+    EXPECT_EQ(help.status, 0);
+    for (const char* option : {"--serve ADDRESS=PORT", "--bind ADDR", "--idle-timeout SECONDS",
+                               "--help", "[::1]:5025", "64 clients"}) {
+        EXPECT_NE(help.out.find(option), std::string::npos) << option;
+    }
+}
+
 TEST(SimServerProgram, BadArgumentsEndWithStatusTwoAndTheUsage) {
     // arguments -> what stderr must name
     const std::vector<std::pair<std::vector<std::string>, std::string>> cases = {
@@ -65,6 +125,12 @@ TEST(SimServerProgram, BadArgumentsEndWithStatusTwoAndTheUsage) {
         {{"--serve", "11"}, "bad --serve entry \"11\""},
         {{"--serve", "11=0,11=0"}, "GPIB address 11 is served twice"},
         {{"--serve", "11=0", "--bind"}, "--bind needs an address"},
+        {{"--serve", "11=0 11=0"}, "GPIB address 11 is served twice"},
+        {{"--serve", "11=0 12"}, "bad --serve entry \"12\""},
+        {{"--serve", "11=0", "--idle-timeout"}, "--idle-timeout needs seconds"},
+        {{"--serve", "11=0", "--idle-timeout", "-1"}, "bad --idle-timeout \"-1\""},
+        {{"--serve", "11=0", "--idle-timeout=86401"}, "bad --idle-timeout \"86401\""},
+        {{"--serve", "11=0", "--idle-timeout", "1.5"}, "bad --idle-timeout \"1.5\""},
     };
     for (const auto& [args, message] : cases) {
         const RunResult r = runProgram(kSim, args);
