@@ -35,7 +35,8 @@ constexpr const char* kUsage =
     "address in brackets, [::1]:5025).\n"
     "\n"
     "  --serve ADDRESS=PORT    generators to serve; entries separated by blanks or commas\n"
-    "  --bind ADDR             address to listen on (default 127.0.0.1)\n"
+    "  --bind ADDR             address to listen on (default 127.0.0.1; an IPv6 address\n"
+    "                          may be bracketed, [::1])\n"
     "  --idle-timeout SECONDS  close a client that for this long neither ends a command line\n"
     "                          nor takes any reply (0..86400, default 60, 0 never)\n"
     "  --help                  show this text\n"
@@ -132,6 +133,10 @@ Options parseArguments(const std::vector<std::string>& args) {
     }
     if (!options.help && options.ports.empty()) {
         throw std::invalid_argument("nothing to serve: give --serve ADDRESS=PORT");
+    }
+    // The serving line brackets an IPv6 address; a script may hand it back that way.
+    if (options.bind.size() > 2 && options.bind.front() == '[' && options.bind.back() == ']') {
+        options.bind = options.bind.substr(1, options.bind.size() - 2);
     }
     if (options.bind.empty()) throw std::invalid_argument("--bind needs an address");
     return options;

@@ -81,15 +81,17 @@ TEST(SimServerProgram, EntriesSplitOnBlanksAndAnIPv6PortIsBracketed) {
     link.write("*IDN?\n");
     EXPECT_EQ(link.read(256), "Veltrix,PG8102A,SIM12,1.0\n");
 
-    RunningProgram v6(kSim, {"--serve", "11=0", "--bind", "::1"}, {}, true);
-    const auto v6Ports = announcedPorts(v6, "zentra-pulse-sim: serving 11 on [::1]:");
-    if (v6Ports.empty() && v6.err().find("Cannot listen") != std::string::npos) {
-        GTEST_SKIP() << "no IPv6 loopback: " << v6.err();
+    for (const char* bind : {"::1", "[::1]"}) {
+        RunningProgram v6(kSim, {"--serve", "11=0", "--bind", bind}, {}, true);
+        const auto v6Ports = announcedPorts(v6, "zentra-pulse-sim: serving 11 on [::1]:");
+        if (v6Ports.empty() && v6.err().find("Cannot listen") != std::string::npos) {
+            GTEST_SKIP() << "no IPv6 loopback: " << v6.err();
+        }
+        ASSERT_EQ(v6Ports.size(), 1u) << bind << ": " << v6.err();
+        transport::RawSocketLink link6("::1", v6Ports[0], 5s);
+        link6.write("*OPC?\n");
+        EXPECT_EQ(link6.read(16), "1\n");
     }
-    ASSERT_EQ(v6Ports.size(), 1u) << v6.err();
-    transport::RawSocketLink link6("::1", v6Ports[0], 5s);
-    link6.write("*OPC?\n");
-    EXPECT_EQ(link6.read(16), "1\n");
 }
 
 TEST(SimServerProgram, IdleTimeoutClosesASilentClient) {
