@@ -11,7 +11,9 @@
 #include <algorithm>
 #include <atomic>
 #include <cerrno>
+#include <cstdint>
 #include <cstring>
+#include <limits>
 #include <stdexcept>
 #include <utility>
 #include <vector>
@@ -20,10 +22,21 @@ namespace zp::sim {
 
 namespace {
 
-constexpr std::size_t kMaxLine = 1 << 20;
-constexpr std::size_t kMaxPendingOutput = 16 << 20;
-constexpr std::size_t kMaxClients = 64;
+using Clock = std::chrono::steady_clock;
+
 constexpr std::size_t kChunk = 64 * 1024;
+// An emptied buffer bigger than this is given back, so that clients at rest stay small.
+constexpr std::size_t kKeptCapacity = 2 * kChunk;
+// Newcomers taken from one port per turn of the loop: a storm of connections cannot starve the
+// clients already served.
+constexpr int kAcceptsPerTurn = 16;
+constexpr int kBacklog = 128;
+// Refused newcomers are kept this long (at most this many) so that their refusal line is not
+// destroyed by a reset when they had already sent something we will never read.
+constexpr std::size_t kMaxRefused = 64;
+constexpr auto kRefusedLinger = std::chrono::seconds(1);
+// Out of file descriptors: the port is left alone for a while instead of spinning on it.
+constexpr auto kAcceptPause = std::chrono::milliseconds(100);
 
 class Fd {
   public:
@@ -51,17 +64,32 @@ class Fd {
 struct Listener {
     Fd fd;
     int address;
+    std::size_t clients = 0;
+    Clock::time_point pausedUntil{};
 };
 
 struct Client {
     Fd fd;
-    int address;
-    std::string in;
-    std::size_t scanned = 0;
+    std::size_t listener;
+    Clock::time_point lastActive;  // last line taken or reply byte sent
+    std::string in;                // received, not yet run
+    std::size_t scanned = 0;       // in[0, scanned) holds no LF of a line not yet run
     std::string out;
-    std::size_t sent = 0;
+    std::size_t sent = 0;       // out[0, sent) is sent
+    bool linesWaiting = false;  // in holds a complete line held back by the output cap
     bool peerClosed = false;
+    bool done = false;
 };
+
+struct Refused {
+    Fd fd;
+    Clock::time_point until;
+    bool done = false;
+};
+
+bool wouldBlock() {
+    return errno == EAGAIN || errno == EWOULDBLOCK;
+}
 
 // Binds and listens; returns the socket and the port actually bound.
 std::pair<Fd, int> listenOn(const std::string& host, int address, int port) {
@@ -71,7 +99,7 @@ std::pair<Fd, int> listenOn(const std::string& host, int address, int port) {
     hints.ai_flags = AI_PASSIVE | AI_NUMERICSERV;
     addrinfo* found = nullptr;
     const std::string where =
-        host + ":" + std::to_string(port) + " for GPIB address " + std::to_string(address);
+        hostAndPort(host, port) + " for GPIB address " + std::to_string(address);
     const int gai = ::getaddrinfo(host.empty() ? nullptr : host.c_str(),
                                   std::to_string(port).c_str(), &hints, &found);
     if (gai != 0) throw std::runtime_error("Cannot listen on " + where + ": " + gai_strerror(gai));
@@ -80,7 +108,8 @@ std::pair<Fd, int> listenOn(const std::string& host, int address, int port) {
                    found->ai_protocol));
     const int one = 1;
     if (fd.get() < 0 || ::setsockopt(fd.get(), SOL_SOCKET, SO_REUSEADDR, &one, sizeof one) != 0 ||
-        ::bind(fd.get(), found->ai_addr, found->ai_addrlen) != 0 || ::listen(fd.get(), 16) != 0) {
+        ::bind(fd.get(), found->ai_addr, found->ai_addrlen) != 0 ||
+        ::listen(fd.get(), kBacklog) != 0) {
         throw std::runtime_error("Cannot listen on " + where + ": " + std::strerror(errno));
     }
     sockaddr_storage bound{};
@@ -96,7 +125,8 @@ std::pair<Fd, int> listenOn(const std::string& host, int address, int port) {
 
 class ScpiServer::Loop {
   public:
-    Loop(Handler handler, std::mutex& mutex) : handler_(std::move(handler)), mutex_(mutex) {
+    Loop(Handler handler, std::mutex& mutex, ScpiServerLimits limits)
+        : handler_(std::move(handler)), mutex_(mutex), limits_(limits) {
         int fds[2];
         if (::pipe2(fds, O_NONBLOCK | O_CLOEXEC) != 0) {
             throw std::runtime_error(std::string("pipe: ") + std::strerror(errno));
@@ -113,113 +143,227 @@ class ScpiServer::Loop {
         [[maybe_unused]] const auto n = ::write(wakeWrite_.get(), &byte, 1);
     }
 
+    std::size_t peak() const { return peak_; }
+
     void run() {
         std::vector<pollfd> polls;
         while (!stopping_) {
+            const auto now = Clock::now();
             polls.clear();
             polls.push_back({wakeRead_.get(), POLLIN, 0});
-            for (const auto& l : listeners_) polls.push_back({l.fd.get(), POLLIN, 0});
-            for (const auto& c : clients_) {
-                short events = 0;
-                if (!c.peerClosed && c.out.size() - c.sent < kMaxPendingOutput) events |= POLLIN;
-                if (c.sent < c.out.size()) events |= POLLOUT;
-                polls.push_back({c.fd.get(), events, 0});
+            for (const auto& l : listeners_) {
+                polls.push_back({l.pausedUntil > now ? -1 : l.fd.get(), POLLIN, 0});
             }
-            if (::poll(polls.data(), polls.size(), -1) < 0) {
+            for (const auto& c : clients_) polls.push_back({c.fd.get(), events(c), 0});
+            for (const auto& r : refused_) polls.push_back({r.fd.get(), POLLIN, 0});
+            if (::poll(polls.data(), polls.size(), timeoutMs(now)) < 0) {
                 if (errno == EINTR) continue;
                 return;
             }
             if (stopping_) return;
-            for (std::size_t i = 0; i < listeners_.size(); ++i) {
-                if (polls[1 + i].revents != 0) accept(listeners_[i]);
-            }
-            const std::size_t firstClient = 1 + listeners_.size();
-            // Clients accepted just now are not in polls; only the older ones are served.
-            const std::size_t polled = polls.size() - firstClient;
-            std::vector<bool> drop(clients_.size(), false);
-            for (std::size_t i = 0; i < polled; ++i) {
-                drop[i] = !serve(clients_[i], polls[firstClient + i].revents);
-            }
-            for (std::size_t i = clients_.size(); i-- > 0;) {
-                if (drop[i]) clients_.erase(clients_.begin() + static_cast<std::ptrdiff_t>(i));
-            }
+            turn(polls, Clock::now());
         }
     }
 
   private:
-    void accept(Listener& listener) {
-        while (true) {
+    // One turn over what poll reported; entries added during the turn wait for the next.
+    void turn(const std::vector<pollfd>& polls, Clock::time_point now) {
+        std::size_t at = 1 + listeners_.size();
+        for (auto& c : clients_) {
+            c.done = !serve(c, polls[at++].revents, now) || idle(c, now);
+            peak_ = std::max<std::size_t>(peak_, c.in.capacity() + c.out.capacity());
+        }
+        for (auto& r : refused_) r.done = !drain(r, polls[at++].revents, now);
+        for (auto& c : clients_) {
+            if (c.done) --listeners_[c.listener].clients;
+        }
+        std::erase_if(clients_, [](const Client& c) { return c.done; });
+        std::erase_if(refused_, [](const Refused& r) { return r.done; });
+        for (std::size_t i = 0; i < listeners_.size(); ++i) {
+            if (polls[1 + i].revents != 0) accept(i, now);
+        }
+    }
+
+    static short events(const Client& c) {
+        short events = 0;
+        if (wantsInput(c)) events |= POLLIN;
+        if (c.sent < c.out.size()) events |= POLLOUT;
+        return events;
+    }
+
+    static bool wantsInput(const Client& c) {
+        return !c.peerClosed && !c.linesWaiting && c.out.size() < kOutputCap;
+    }
+
+    // Until the next deadline: an idle client, a refused one, a paused port. -1: none.
+    int timeoutMs(Clock::time_point now) const {
+        std::optional<Clock::time_point> next;
+        const auto consider = [&next](Clock::time_point t) {
+            if (!next || t < *next) next = t;
+        };
+        for (const auto& l : listeners_) {
+            if (l.pausedUntil > now) consider(l.pausedUntil);
+        }
+        for (const auto& c : clients_) {
+            if (c.linesWaiting && c.out.size() < kOutputCap) return 0;
+            if (limits_.idleTimeout.count() > 0) consider(c.lastActive + limits_.idleTimeout);
+        }
+        for (const auto& r : refused_) consider(r.until);
+        if (!next) return -1;
+        if (*next <= now) return 0;
+        const auto wait = std::chrono::ceil<std::chrono::milliseconds>(*next - now).count();
+        return static_cast<int>(std::min<std::int64_t>(wait, std::numeric_limits<int>::max()));
+    }
+
+    bool idle(const Client& c, Clock::time_point now) const {
+        return limits_.idleTimeout.count() > 0 && now - c.lastActive >= limits_.idleTimeout;
+    }
+
+    void accept(std::size_t index, Clock::time_point now) {
+        Listener& listener = listeners_[index];
+        for (int i = 0; i < kAcceptsPerTurn; ++i) {
             Fd fd(::accept4(listener.fd.get(), nullptr, nullptr, SOCK_NONBLOCK | SOCK_CLOEXEC));
-            if (fd.get() < 0) return;
-            if (clients_.size() >= kMaxClients) continue;  // refused: closed at once
+            if (fd.get() < 0) {
+                if (errno == ECONNABORTED || errno == EPROTO || errno == EINTR) continue;
+                if (errno == EMFILE || errno == ENFILE || errno == ENOBUFS || errno == ENOMEM) {
+                    listener.pausedUntil = now + kAcceptPause;
+                }
+                return;
+            }
+            if (listener.clients >= limits_.clientsPerPort) {
+                refuse(std::move(fd), now);
+                continue;
+            }
             const int one = 1;
             ::setsockopt(fd.get(), IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
-            clients_.push_back(Client{std::move(fd), listener.address, {}, 0, {}, 0, false});
+            Client client{};
+            client.fd = std::move(fd);
+            client.listener = index;
+            client.lastActive = now;
+            clients_.push_back(std::move(client));
+            ++listener.clients;
         }
+    }
+
+    void refuse(Fd fd, Clock::time_point now) {
+        const std::string text = "ERROR: too many clients on this port (" +
+                                 std::to_string(limits_.clientsPerPort) + "); try again later\n";
+        // A new connection's send buffer takes the line whole.
+        [[maybe_unused]] const auto n = ::send(fd.get(), text.data(), text.size(), MSG_NOSIGNAL);
+        ::shutdown(fd.get(), SHUT_WR);
+        if (refused_.size() >= kMaxRefused) refused_.erase(refused_.begin());
+        refused_.push_back({std::move(fd), now + kRefusedLinger});
+    }
+
+    // Reads and drops what a refused client sends; false when it is to be closed.
+    static bool drain(Refused& r, short revents, Clock::time_point now) {
+        if (now >= r.until) return false;
+        if (revents == 0) return true;
+        char scratch[4096];
+        const ssize_t n = ::recv(r.fd.get(), scratch, sizeof scratch, 0);
+        return n > 0 || (n < 0 && (wouldBlock() || errno == EINTR));
     }
 
     // False when the client is to be dropped.
-    bool serve(Client& c, short revents) {
-        if ((revents & (POLLIN | POLLHUP | POLLERR)) != 0 && !c.peerClosed) {
+    bool serve(Client& c, short revents, Clock::time_point now) {
+        if ((revents & (POLLIN | POLLHUP | POLLERR)) != 0 && wantsInput(c)) {
             if (!receive(c)) return false;
         }
-        if (!flush(c)) return false;
-        return !(c.peerClosed && c.sent == c.out.size());
+        if (!runLines(c, now) || !flush(c, now)) return false;
+        return !(c.peerClosed && !c.linesWaiting && c.sent == c.out.size());
     }
 
-    bool receive(Client& c) {
+    static bool receive(Client& c) {
         char buffer[kChunk];
         const ssize_t n = ::recv(c.fd.get(), buffer, sizeof buffer, 0);
-        if (n < 0) return errno == EAGAIN || errno == EWOULDBLOCK || errno == EINTR;
+        if (n < 0) return wouldBlock() || errno == EINTR;
         if (n == 0) {
             c.peerClosed = true;
         } else {
             c.in.append(buffer, static_cast<std::size_t>(n));
         }
+        return true;
+    }
+
+    // Runs the complete lines received while the replies waiting stay under the cap; the rest
+    // wait, unread, until the client has taken some.
+    bool runLines(Client& c, Clock::time_point now) {
         std::size_t start = 0;
+        std::size_t from = c.scanned;
+        c.linesWaiting = false;
         while (true) {
-            const std::size_t lf = c.in.find('\n', std::max(start, c.scanned));
-            if (lf == std::string::npos) break;
+            const std::size_t lf = c.in.find('\n', from);
+            if (lf == std::string::npos) {
+                from = c.in.size();
+                break;
+            }
             if (lf - start > kMaxLine) return false;
+            if (c.out.size() >= kOutputCap) {
+                c.linesWaiting = true;
+                from = lf;
+                break;
+            }
             std::string_view line(c.in.data() + start, lf - start);
             if (!line.empty() && line.back() == '\r') line.remove_suffix(1);
             std::optional<std::string> reply;
             {
                 const std::lock_guard lock(mutex_);
-                reply = handler_(c.address, line);
+                reply = handler_(listeners_[c.listener].address, line);
             }
             if (reply) c.out += *reply;
+            c.lastActive = now;
             start = lf + 1;
+            from = start;
         }
         c.in.erase(0, start);
-        c.scanned = c.in.size();
-        return c.in.size() <= kMaxLine;
+        c.scanned = from - start;
+        if (c.in.empty() && c.in.capacity() > kKeptCapacity) std::string().swap(c.in);
+        return c.linesWaiting || c.in.size() <= kMaxLine;
     }
 
-    bool flush(Client& c) {
+    static bool flush(Client& c, Clock::time_point now) {
         while (c.sent < c.out.size()) {
             const ssize_t n =
                 ::send(c.fd.get(), c.out.data() + c.sent, c.out.size() - c.sent, MSG_NOSIGNAL);
-            if (n < 0) return errno == EAGAIN || errno == EWOULDBLOCK || errno == EINTR;
+            if (n < 0) {
+                if (errno == EINTR) continue;
+                if (!wouldBlock()) return false;
+                break;
+            }
             c.sent += static_cast<std::size_t>(n);
+            c.lastActive = now;
         }
-        c.out.clear();
-        c.sent = 0;
+        if (c.sent == c.out.size()) {
+            c.sent = 0;
+            if (c.out.capacity() > kKeptCapacity) {
+                std::string().swap(c.out);
+            } else {
+                c.out.clear();
+            }
+        } else if (c.sent >= c.out.size() / 2) {
+            // Dropping the sent part only once it is half the buffer copies at most one byte
+            // per byte sent.
+            c.out.erase(0, c.sent);
+            c.sent = 0;
+        }
         return true;
     }
 
     Handler handler_;
     std::mutex& mutex_;
+    const ScpiServerLimits limits_;
     std::atomic<bool> stopping_{false};
     Fd wakeRead_;
     Fd wakeWrite_;
     std::vector<Listener> listeners_;
     std::vector<Client> clients_;
+    std::vector<Refused> refused_;
+    std::atomic<std::size_t> peak_{0};
 };
 
 ScpiServer::ScpiServer(const std::map<int, int>& ports, Handler handler,
-                       const std::string& bindAddress)
-    : bindAddress_(bindAddress), loop_(std::make_unique<Loop>(std::move(handler), mutex_)) {
+                       const std::string& bindAddress, ScpiServerLimits limits)
+    : bindAddress_(bindAddress), loop_(std::make_unique<Loop>(std::move(handler), mutex_, limits)) {
     if (ports.empty()) throw std::runtime_error("No addresses to serve");
     for (const auto& [address, port] : ports) {
         if (port < 0 || port > 65535) {
@@ -261,9 +405,18 @@ std::string ScpiServer::describe() const {
     std::string text;
     for (const auto& [address, port] : ports_) {
         if (!text.empty()) text += ", ";
-        text += std::to_string(address) + " on " + bindAddress_ + ":" + std::to_string(port);
+        text += std::to_string(address) + " on " + hostAndPort(bindAddress_, port);
     }
     return text;
+}
+
+std::size_t ScpiServer::peakConnectionBytes() const {
+    return loop_->peak();
+}
+
+std::string hostAndPort(const std::string& host, int port) {
+    const bool v6 = host.find(':') != std::string::npos;
+    return (v6 ? "[" + host + "]" : host) + ":" + std::to_string(port);
 }
 
 void ScpiServer::withLock(const std::function<void()>& f) {

@@ -14,6 +14,7 @@ namespace zp::sim {
 namespace {
 
 constexpr std::size_t kErrorQueueCapacity = 30;
+constexpr ScpiErrorCode kSettingsConflictCode{-221, "Settings conflict"};
 constexpr const char* kNoError = "+0,\"No error\"";
 
 constexpr double kMinFrequency = 1e-3;
@@ -106,7 +107,10 @@ void twoWay(Context& c, bool& flag, std::string_view whenSet, std::string_view w
 void numeric(Context& c, double& value, ScpiUnit unit, double low, double high) {
     setting(
         c, [&] { return formatNumber(value); },
-        [&](const std::string& p) { value = inRange(parseNumber(p, unit), low, high); });
+        [&](const std::string& p) {
+            const double number = inRange(parseNumber(p, unit), low, high);
+            value = number == 0.0 ? 0.0 : number;  // "-0" would read back as "-0"
+        });
 }
 
 void onOff(Context& c, bool& flag) {
@@ -161,8 +165,18 @@ void levelLow(Context& c) {
     numeric(c, c.out().low, ScpiUnit::volt, kMinLevel, kMaxLevel);
 }
 
+// The frequency is taken even when its period is shorter than a width, which is kept; the
+// conflict is queued, as an instrument does for coupled settings it cannot both honour.
 void frequency(Context& c) {
     numeric(c, c.state.frequency, ScpiUnit::hertz, kMinFrequency, kMaxFrequency);
+    if (c.query) return;
+    const double period = 1.0 / c.state.frequency;
+    for (const auto& output : c.state.outputs) {
+        if (output.width > period) {
+            c.generator.pushError(errorEntry(kSettingsConflictCode));
+            return;
+        }
+    }
 }
 
 void pulseWidth(Context& c) {

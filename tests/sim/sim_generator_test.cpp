@@ -144,9 +144,39 @@ TEST_F(SimGeneratorTest, ValuesOutOfRangeAreRejectedAndKeepTheOldValue) {
     EXPECT_DOUBLE_EQ(out(1).width, 1e-6);
     EXPECT_DOUBLE_EQ(gen.state().frequency, 1e3);
     // Boundaries are inside.
-    gen.handle(":VOLT1:HIGH 10;:VOLT1:LOW -10;:SOUR:PULS:WIDT1 1MS;:SOUR:FREQ 165MHZ");
+    gen.handle(":VOLT1:HIGH 10;:VOLT1:LOW -10;:SOUR:PULS:WIDT1 1MS;:SOUR:PULS:WIDT2 0");
     EXPECT_EQ(nextError(), "+0,\"No error\"\n");
     EXPECT_DOUBLE_EQ(out(1).width, 1e-3);
+    gen.handle(":SOUR:FREQ 165MHZ");  // taken, though width 1 no longer fits
+    EXPECT_EQ(nextError(), "-221,\"Settings conflict\"\n");
+    EXPECT_DOUBLE_EQ(gen.state().frequency, 165e6);
+}
+
+TEST_F(SimGeneratorTest, NegativeZeroReadsBackAsZero) {
+    for (const char* setting :
+         {":SOUR:PULS:WIDT1", ":SOUR:PULS:DEL2", ":VOLT1:LOW", ":VOLT2:HIGH"}) {
+        for (const char* zero : {"-0", "-0.0E+3", "-.0"}) {
+            gen.handle(std::string(setting) + " " + zero);
+            EXPECT_EQ(query(std::string(setting) + "?"), "0\n") << setting << " " << zero;
+        }
+    }
+    EXPECT_EQ(nextError(), "+0,\"No error\"\n");
+}
+
+TEST_F(SimGeneratorTest, APeriodShorterThanAWidthIsTakenWithASettingsConflict) {
+    gen.handle(":SOUR:PULS:WIDT2 4E-4;:SOUR:PULS:WIDT1 2E-4");  // period 1 ms
+    // frequency -> entries queued (a period equal to the width fits; two outputs too wide, one)
+    const std::pair<const char*, int> cases[] = {
+        {"2500", 0}, {"2501", 1}, {"1E6;:FREQ 1E5;:FREQ 1E3", 2}, {"1E4", 1}};
+    for (const auto& [frequency, conflicts] : cases) {
+        gen.handle(std::string(":SOUR:FREQ ") + frequency);
+        for (int i = 0; i < conflicts; ++i) {
+            EXPECT_EQ(nextError(), "-221,\"Settings conflict\"\n") << frequency;
+        }
+        EXPECT_EQ(nextError(), "+0,\"No error\"\n") << frequency;
+    }
+    EXPECT_EQ(query(":SOUR:FREQ?;:PULS:WIDT2?;:PULS:WIDT1?"), "10000;0.0004;0.0002\n");
+    EXPECT_EQ(nextError(), "+0,\"No error\"\n");  // the query queued nothing
 }
 
 TEST_F(SimGeneratorTest, ErrorQueueIsBoundedWithOverflowLast) {

@@ -1,0 +1,126 @@
+// The generator server under clients that ask far ahead of what they read: 1 GiB of 1 MiB
+// replies per iteration, and generator queries answered by the simulated generator. The
+// counters are what must stay small while that passes: the most one connection held
+// (peak_conn_MiB) and the process's peak resident size (VmHWM_MiB).
+
+#include <benchmark/benchmark.h>
+#include <netinet/in.h>
+#include <netinet/tcp.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <cstdint>
+#include <fstream>
+#include <map>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "sim/scpi_server.h"
+#include "sim/sim_generator.h"
+
+namespace {
+
+constexpr double kMiB = 1024.0 * 1024.0;
+
+// kB figure of one /proc/self/status line, e.g. "VmHWM:".
+double statusMiB(const std::string& key) {
+    std::ifstream status("/proc/self/status");
+    std::string word;
+    while (status >> word) {
+        if (word == key) {
+            double kb = 0;
+            status >> kb;
+            return kb / 1024.0;
+        }
+    }
+    return 0;
+}
+
+class Client {
+  public:
+    explicit Client(int port) : fd_(::socket(AF_INET, SOCK_STREAM, 0)) {
+        sockaddr_in a{};
+        a.sin_family = AF_INET;
+        a.sin_port = htons(static_cast<std::uint16_t>(port));
+        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+        if (::connect(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a) != 0) {
+            throw std::runtime_error("connect");
+        }
+        const int one = 1;
+        ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
+    }
+    ~Client() { ::close(fd_); }
+    Client(const Client&) = delete;
+    Client& operator=(const Client&) = delete;
+
+    void write(const std::string& text) {
+        for (std::size_t done = 0; done < text.size();) {
+            const ssize_t n = ::send(fd_, text.data() + done, text.size() - done, MSG_NOSIGNAL);
+            if (n <= 0) throw std::runtime_error("send");
+            done += static_cast<std::size_t>(n);
+        }
+    }
+    // Reads at most one buffer; the byte count.
+    std::size_t readSome() {
+        const ssize_t n = ::recv(fd_, buffer_.data(), buffer_.size(), 0);
+        if (n <= 0) throw std::runtime_error("recv");
+        return static_cast<std::size_t>(n);
+    }
+
+  private:
+    int fd_;
+    std::vector<char> buffer_ = std::vector<char>(64 * 1024);
+};
+
+// Keeps `ahead` queries unanswered, asking one more per reply read, until `total` bytes came.
+void askAhead(Client& client, const std::string& query, std::size_t replySize, int ahead,
+              std::size_t total) {
+    for (int i = 0; i < ahead; ++i) client.write(query);
+    std::size_t asked = static_cast<std::size_t>(ahead) * replySize;
+    std::size_t received = 0;
+    while (received < total) {
+        received += client.readSome();
+        while (asked < total && asked < received + static_cast<std::size_t>(ahead) * replySize) {
+            client.write(query);
+            asked += replySize;
+        }
+    }
+}
+
+void report(benchmark::State& state, const zp::sim::ScpiServer& server, std::size_t perRun) {
+    state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * perRun));
+    state.counters["peak_conn_MiB"] = static_cast<double>(server.peakConnectionBytes()) / kMiB;
+    state.counters["VmHWM_MiB"] = statusMiB("VmHWM:");
+}
+
+void BM_SimServerGibibyteToAClientAskingAhead(benchmark::State& state) {
+    const std::string reply = std::string((1u << 20) - 1, 'r') + "\n";
+    zp::sim::ScpiServer server({{11, 0}}, [&reply](int, std::string_view) { return reply; });
+    constexpr std::size_t kTotal = std::size_t{1} << 30;
+    for (auto _ : state) {
+        Client client(server.port(11));
+        askAhead(client, "MEG?\n", reply.size(), 64, kTotal);
+    }
+    report(state, server, kTotal);
+}
+BENCHMARK(BM_SimServerGibibyteToAClientAskingAhead)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+void BM_SimServerGeneratorQueriesAskedAhead(benchmark::State& state) {
+    std::map<int, std::unique_ptr<zp::sim::SimGenerator>> generators;
+    generators[11] = std::make_unique<zp::sim::SimGenerator>(11, "");
+    zp::sim::ScpiServer server({{11, 0}}, zp::sim::ScpiServer::forGenerators(generators));
+    const std::string reply = "Veltrix,PG8102A,SIM11,1.0\n";
+    constexpr std::size_t kQueries = 1 << 16;
+    for (auto _ : state) {
+        Client client(server.port(11));
+        askAhead(client, "*IDN?\n", reply.size(), 4096, kQueries * reply.size());
+    }
+    report(state, server, kQueries * reply.size());
+    state.counters["queries/s"] = benchmark::Counter(
+        static_cast<double>(state.iterations() * kQueries), benchmark::Counter::kIsRate);
+}
+BENCHMARK(BM_SimServerGeneratorQueriesAskedAhead)->Unit(benchmark::kMillisecond)->UseRealTime();
+
+}  // namespace
