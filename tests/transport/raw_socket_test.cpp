@@ -126,17 +126,31 @@ TEST_F(TransportBusTest, IdentificationAndProgrammingThroughTheBus) {
                              }));
 }
 
-TEST_F(TransportBusTest, TimeoutSetsErrAndTimoAndKeepsTheBuffer) {
+TEST_F(TransportBusTest, TimeoutSetsErrAndTimoKeepsTheBufferAndClosesUntilCleared) {
     const auto d = bus->openDevice(0, 11, 0, 9, 1, 0);  // code 9: 100 ms
     bus->writeText(d, "SILENT?\n");
     EXPECT_EQ(read(d), std::string(100, ' '));
     EXPECT_EQ(bus->status(), kErr | kTimo);
     EXPECT_EQ(trace.lines().back(), "BUS 11 timeout");
+    // A late reply must not pass for the next one: the link stays closed until cleared.
     bus->writeText(d, "*OPC?\n");
-    EXPECT_EQ(bus->status(), 0) << "the next good call clears the status";
+    EXPECT_EQ(bus->status(), kErr);
+    bus->clearDevice(d);
+    EXPECT_EQ(bus->status(), 0);
+    bus->writeText(d, "*OPC?\n");
+    EXPECT_EQ(read(d), "1\n");
     bus->writeText(42, "*IDN?\n");
     EXPECT_EQ(bus->status(), kErr);
     EXPECT_EQ(bus->addressOf(42), -1);
+}
+
+TEST_F(TransportBusTest, OpeningAgainReconnectsALinkThatAFailureClosed) {
+    const auto d = bus->openDevice(0, 12, 0, 9, 1, 0);
+    bus->writeText(d, "SILENT?\n");
+    read(d);
+    const auto again = bus->openDevice(0, 12, 0, 9, 1, 0);
+    bus->writeText(d, "*OPC?\n");  // the older descriptor uses the new connection too
+    EXPECT_EQ(read(again), "1\n");
 }
 
 TEST_F(TransportBusTest, AddressWithoutResourceAndUnreachableResourceThrow) {
