@@ -10,6 +10,7 @@
 #include "instruments/error_capture.h"
 #include "instruments/instrument_error.h"
 #include "instruments/io_trace.h"
+#include "scripted_peer.h"
 #include "transport/transport_factory.h"
 #include "transport_test_util.h"
 
@@ -89,6 +90,26 @@ TEST(RawSocket, RefusedConnectNamesHostAndPortAndClosedPeerIsAnError) {
     } catch (const LinkFailure& e) {
         EXPECT_FALSE(e.timedOut());
     }
+}
+
+TEST(RawSocket, BracketedIpv6ResourceReachesTheLoopback) {
+    ScriptedPeer peer(
+        [](ScriptedPeer& p, int fd) {
+            if (p.readLine(fd) == "*OPC?\n") p.sendText(fd, "1\n");
+            p.pause(10s);
+        },
+        AF_INET6);
+    if (!peer.listening()) GTEST_SKIP() << "this machine has no IPv6 loopback (::1)";
+    auto bus = makeTransportBus(
+        {{11, "TCPIP0::[::1]::" + std::to_string(peer.port()) + "::SOCKET"}}, nullptr);
+    const auto d = bus->openDevice(0, 11, 0, 11, 1, 0);
+    bus->writeText(d, "*OPC?\n");
+    std::string buffer(100, ' ');
+    bus->readText(d, buffer);
+    EXPECT_EQ(buffer, "1\n");
+    const int port = unusedPort();
+    EXPECT_EQ(errorOf([&] { RawSocketLink("::1", port, 1s); }),
+              "Cannot connect to [::1]:" + std::to_string(port) + ": Connection refused");
 }
 
 class TransportBusTest : public ::testing::Test {
