@@ -28,7 +28,7 @@ int clampMs(std::chrono::milliseconds timeout) {
     return timeout.count() > 1'000'000'000 ? 1'000'000'000 : static_cast<int>(timeout.count());
 }
 
-// At least 1 ms: liblxi would take 0 as "do not wait at all" and fail the call outright.
+// At least 1 ms: a VXI-11 timeout of 0 means "do not wait at all".
 int remainingMs(Clock::time_point deadline) {
     const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now());
     return std::max(1, clampMs(left));
