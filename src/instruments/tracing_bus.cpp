@@ -5,7 +5,9 @@
 namespace zp {
 
 TracingBus::TracingBus(std::unique_ptr<InstrumentBus> inner, IoTrace& trace)
-    : inner_(std::move(inner)), trace_(trace) {}
+    : inner_(std::move(inner)),
+      drainSource_(dynamic_cast<ReplyDrainSource*>(inner_.get())),
+      trace_(trace) {}
 
 std::int16_t TracingBus::openDevice(int board, int primaryAddress, int secondaryAddress,
                                     int timeoutCode, int endOrIdentify, int endOfString) {
@@ -27,6 +29,16 @@ std::int16_t TracingBus::openDevice(int board, int primaryAddress, int secondary
 
 void TracingBus::writeText(std::int16_t descriptor, const std::string& text) {
     const int address = inner_->addressOf(descriptor);
+    if (drainSource_ != nullptr) {
+        // Dropped here rather than inside the write so that the line comes before the write's.
+        const std::size_t dropped = drainSource_->drainReplies(descriptor);
+        if (dropped > 0) trace_.busEvent(address, "drained " + std::to_string(dropped) + " bytes");
+        if ((inner_->status() & kStatusError) != 0) {
+            trace_.busWrite(address, text);  // not sent: the failure line follows
+            traceFailure(address);
+            return;
+        }
+    }
     trace_.busWrite(address, text);
     inner_->writeText(descriptor, text);
     if ((inner_->status() & kStatusError) != 0) traceFailure(address);

@@ -1,9 +1,12 @@
 #pragma once
 // A bus decorator that writes every call of the bus it wraps to the I/O trace:
-//   BUS <addr> open | W "<text>" | R "<text>" | clear | timeout | error <text>
+//   BUS <addr> open | W "<text>" | R "<text>" | clear | drained <n> bytes | timeout | error <text>
 // A write is traced before it is sent, a read after it returned; a failed call adds a "timeout"
-// line (status ERR|TIMO) or an "error" line with the wrapped bus's reason.
+// line (status ERR|TIMO) or an "error" line with the wrapped bus's reason. Unread reply text that
+// the wrapped bus drops before a write shows as a "drained" line ahead of the write.
 
+#include <cstddef>
+#include <cstdint>
 #include <memory>
 #include <string>
 
@@ -18,6 +21,14 @@ class BusErrorSource {
   public:
     virtual ~BusErrorSource() = default;
     virtual std::string lastErrorText() const = 0;
+};
+
+// Implemented by buses whose links can hold the unread rest of a reply: drops it before a write
+// and returns how many bytes went. A failure sets status().
+class ReplyDrainSource {
+  public:
+    virtual ~ReplyDrainSource() = default;
+    virtual std::size_t drainReplies(std::int16_t descriptor) = 0;
 };
 
 class TracingBus : public InstrumentBus {
@@ -39,6 +50,7 @@ class TracingBus : public InstrumentBus {
     void traceFailure(int address);
 
     std::unique_ptr<InstrumentBus> inner_;
+    ReplyDrainSource* drainSource_;  // inner_ when it can drop replies, else null
     IoTrace& trace_;
 };
 

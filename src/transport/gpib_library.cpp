@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 
 #include <algorithm>
+#include <chrono>
 #include <cstdlib>
 
 #include "instruments/instrument_error.h"
@@ -138,7 +139,7 @@ std::string GpibLibrary::errorText() const {
 
 GpibLink::GpibLink(std::shared_ptr<GpibLibrary> library, const GpibResource& resource,
                    int timeoutCode)
-    : library_(std::move(library)) {
+    : library_(std::move(library)), timeout_(timeoutForCode(timeoutCode)) {
     const int sad = resource.secondary < 0 ? 0 : 0x60 + resource.secondary;
     ud_ = library_->ibdev(resource.board, resource.primary, sad, timeoutCode, 1, 0);
     if (ud_ < 0 || (library_->status() & GpibLibrary::kErr) != 0) {
@@ -153,12 +154,14 @@ GpibLink::~GpibLink() {
     if (ud_ >= 0) library_->ibonl(ud_, 0);
 }
 
-void GpibLink::fail(const char* call) const {
+void GpibLink::fail(const char* call) {
+    unfinished_ = false;  // whatever is left of the reply is the device's to discard now
     const bool timedOut = (library_->status() & GpibLibrary::kTimo) != 0;
     throw LinkFailure(std::string(call) + ": " + library_->errorText(), timedOut);
 }
 
 void GpibLink::write(std::string_view text) {
+    drainReplies();
     library_->ibwrt(ud_, text.data(), static_cast<long>(text.size()));
     if ((library_->status() & GpibLibrary::kErr) != 0) fail("ibwrt");
 }
@@ -170,10 +173,31 @@ std::string GpibLink::read(std::size_t maxChars) {
     const long n = library_->count();
     buffer.resize(
         static_cast<std::size_t>(std::clamp<long>(n, 0, static_cast<long>(buffer.size()))));
+    if (!buffer.empty()) unfinished_ = (library_->status() & GpibLibrary::kEnd) == 0;
     return buffer;
 }
 
+std::size_t GpibLink::drainReplies() {
+    const auto deadline = std::chrono::steady_clock::now() + timeout_;
+    std::size_t dropped = 0;
+    char scratch[4096];
+    while (unfinished_) {
+        // Each ibrd has its own timeout; a device that streams without END must still stop.
+        if (std::chrono::steady_clock::now() >= deadline) {
+            unfinished_ = false;
+            throw LinkFailure("ibrd: the rest of an earlier reply did not end in time", true);
+        }
+        library_->ibrd(ud_, scratch, static_cast<long>(sizeof scratch));
+        if ((library_->status() & GpibLibrary::kErr) != 0) fail("ibrd");
+        dropped += static_cast<std::size_t>(
+            std::clamp<long>(library_->count(), 0, static_cast<long>(sizeof scratch)));
+        unfinished_ = (library_->status() & GpibLibrary::kEnd) == 0;
+    }
+    return dropped;
+}
+
 void GpibLink::clear() {
+    unfinished_ = false;
     library_->ibclr(ud_);
     if ((library_->status() & GpibLibrary::kErr) != 0) fail("ibclr");
 }

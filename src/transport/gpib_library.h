@@ -17,6 +17,7 @@ class GpibLibrary {
   public:
     static constexpr int kErr = 0x8000;
     static constexpr int kTimo = 0x4000;
+    static constexpr int kEnd = 0x2000;
 
     // Library file names tried in order (ZP_GPIB_LIBRARY alone when set).
     static std::vector<std::string> candidates();
@@ -62,22 +63,29 @@ class GpibLibrary {
     int (*threadIberr_)() = nullptr;    // optional
 };
 
-// One device on the board; taken off line when destroyed.
+// One device on the board; taken off line when destroyed. The driver bounds each call by the
+// timeout code as a whole.
 class GpibLink : public DeviceLink {
   public:
     // Throws InstrumentError when the board refuses the device.
     GpibLink(std::shared_ptr<GpibLibrary> library, const GpibResource& resource, int timeoutCode);
     ~GpibLink() override;
 
+    // A device that still holds part of a reply would discard it on the next write and queue
+    // "Query INTERRUPTED"; the rest is read off first instead.
     void write(std::string_view text) override;
     std::string read(std::size_t maxChars) override;
+    // Reads the rest of a reply whose END has not come yet, within one timeout.
+    std::size_t drainReplies() override;
     void clear() override;
 
   private:
-    [[noreturn]] void fail(const char* call) const;
+    [[noreturn]] void fail(const char* call);
 
     std::shared_ptr<GpibLibrary> library_;
     int ud_ = -1;
+    std::chrono::milliseconds timeout_;
+    bool unfinished_ = false;  // the last read stopped at the buffer size, before END
 };
 
 }  // namespace zp::transport

@@ -1,14 +1,15 @@
 #pragma once
 // VISA-style resource texts of the generator transports.
 
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <variant>
 
 namespace zp::transport {
 
-struct SocketResource {  // TCPIP[board]::host::port::SOCKET
-    std::string host;
+struct SocketResource {  // TCPIP[board]::host::port::SOCKET, host may be [IPv6]
+    std::string host;    // without brackets
     int port = 0;
 };
 
@@ -25,8 +26,18 @@ struct GpibResource {  // GPIB[board]::primary[::secondary]::INSTR
 
 using Resource = std::variant<SocketResource, Vxi11Resource, GpibResource>;
 
-// Keywords are case-insensitive. Throws std::invalid_argument naming the text and the accepted
-// forms.
+// A refused resource text; reason() says what is wrong and what was expected, what() adds the
+// text itself.
+class BadResource : public std::invalid_argument {
+  public:
+    BadResource(std::string_view text, std::string reason);
+    const std::string& reason() const { return reason_; }
+
+  private:
+    std::string reason_;
+};
+
+// Keywords are case-insensitive. Throws BadResource.
 Resource parseResource(std::string_view text);
 
 }  // namespace zp::transport

@@ -56,9 +56,12 @@ std::int16_t ResourceBus::openDevice(int board, int primaryAddress, int, int tim
     }
     try {
         auto& link = links_[primaryAddress];
-        if (!link) link = factory_(it->second, timeoutCode);
+        if (!link || !link->isOpen()) {
+            link.reset();  // an instrument may take one connection only: close before connecting
+            link = factory_(it->second, timeoutCode);
+        }
         const std::int16_t descriptor = next_++;
-        devices_.emplace(descriptor, Device{primaryAddress, link});
+        devices_.emplace(descriptor, primaryAddress);
         status_ = 0;
         return descriptor;
     } catch (const InstrumentError&) {
@@ -70,21 +73,23 @@ std::int16_t ResourceBus::openDevice(int board, int primaryAddress, int, int tim
     }
 }
 
-ResourceBus::Device* ResourceBus::find(std::int16_t descriptor) {
-    const auto it = devices_.find(descriptor);
-    return it == devices_.end() ? nullptr : &it->second;
-}
-
 template <typename Call>
 void ResourceBus::run(std::int16_t descriptor, Call call) {
-    Device* device = find(descriptor);
-    if (device == nullptr) {
+    const auto device = devices_.find(descriptor);
+    if (device == devices_.end()) {
         status_ = kStatusError;
         lastError_ = "invalid descriptor " + std::to_string(descriptor);
         return;
     }
+    DeviceLink* link = links_[device->second].get();
+    if (link == nullptr) {  // opening it again failed
+        status_ = kStatusError;
+        lastError_ = "GPIB address " + std::to_string(device->second) +
+                     " has no connection; open the device again";
+        return;
+    }
     try {
-        call(*device->link);
+        call(*link);
         status_ = 0;
     } catch (const LinkFailure& e) {
         status_ = e.timedOut() ? (kStatusError | kStatusTimeout) : kStatusError;
@@ -94,6 +99,12 @@ void ResourceBus::run(std::int16_t descriptor, Call call) {
 
 void ResourceBus::writeText(std::int16_t descriptor, const std::string& text) {
     run(descriptor, [&](DeviceLink& link) { link.write(text); });
+}
+
+std::size_t ResourceBus::drainReplies(std::int16_t descriptor) {
+    std::size_t dropped = 0;
+    run(descriptor, [&](DeviceLink& link) { dropped = link.drainReplies(); });
+    return dropped;
 }
 
 void ResourceBus::readText(std::int16_t descriptor, std::string& buffer) {
@@ -106,7 +117,7 @@ void ResourceBus::clearDevice(std::int16_t descriptor) {
 
 int ResourceBus::addressOf(std::int16_t descriptor) const {
     const auto it = devices_.find(descriptor);
-    return it == devices_.end() ? -1 : it->second.address;
+    return it == devices_.end() ? -1 : it->second;
 }
 
 }  // namespace zp::transport

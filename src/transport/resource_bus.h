@@ -4,7 +4,9 @@
 // Descriptors opened for the same address share one link, as two descriptors for one GPIB
 // device talk to the same instrument (many LAN instruments accept one socket only).
 // Status word as on a GPIB board: 0 after a good call, ERR after a failed one, ERR|TIMO after a
-// timeout. Reads return at most buffer.size() characters; the rest comes with the next read.
+// timeout. Reads return at most buffer.size() characters; the rest comes with the next read, but
+// a write first drops what is left of earlier replies. A link that a failure closed is opened
+// anew by the next openDevice for its address (or by clearDevice).
 
 #include <cstdint>
 #include <functional>
@@ -26,7 +28,7 @@ using LinkFactory =
 // The links every resource kind uses in the program.
 std::unique_ptr<DeviceLink> openLink(const Resource& resource, int timeoutCode);
 
-class ResourceBus : public InstrumentBus, public BusErrorSource {
+class ResourceBus : public InstrumentBus, public BusErrorSource, public ReplyDrainSource {
   public:
     // Throws std::invalid_argument for a resource text that does not parse.
     explicit ResourceBus(const BusResources& resources, LinkFactory factory = openLink);
@@ -41,21 +43,17 @@ class ResourceBus : public InstrumentBus, public BusErrorSource {
     int addressOf(std::int16_t descriptor) const override;
 
     std::string lastErrorText() const override { return lastError_; }
+    std::size_t drainReplies(std::int16_t descriptor) override;
 
   private:
-    struct Device {
-        int address;
-        std::shared_ptr<DeviceLink> link;
-    };
-    Device* find(std::int16_t descriptor);
     template <typename Call>
     void run(std::int16_t descriptor, Call call);
 
     std::map<int, Resource> resources_;
     std::map<int, std::string> texts_;
     LinkFactory factory_;
-    std::map<std::int16_t, Device> devices_;
-    std::map<int, std::shared_ptr<DeviceLink>> links_;  // per address
+    std::map<std::int16_t, int> devices_;               // descriptor -> address
+    std::map<int, std::unique_ptr<DeviceLink>> links_;  // per address
     std::int16_t next_ = 1;
     std::uint16_t status_ = 0;
     std::string lastError_;

@@ -98,7 +98,11 @@ BusResources parseBusResources(std::string_view text) {
         if (resource.empty()) {
             throw std::invalid_argument("Bus entry \"" + e + "\" names no resource");
         }
-        transport::parseResource(resource);  // throws with the reason
+        try {
+            transport::parseResource(resource);
+        } catch (const transport::BadResource& bad) {
+            throw std::invalid_argument("Bus entry \"" + e + "\": " + bad.reason());
+        }
         if (!resources.emplace(address, resource).second) {
             throw std::invalid_argument("GPIB address " + std::to_string(address) +
                                         " is given more than once");

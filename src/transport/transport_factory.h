@@ -1,6 +1,6 @@
 #pragma once
 // Real generator transports, chosen by VISA-style resource text:
-//   TCPIP0::host::port::SOCKET      raw SCPI socket
+//   TCPIP0::host::port::SOCKET      raw SCPI socket (host may be an IPv6 address in brackets)
 //   TCPIP0::gateway::gpib0,N::INSTR VXI-11 through a LAN/GPIB gateway (liblxi)
 //   GPIB0::N::INSTR                 local GPIB board through the driver library loaded at run time
 
@@ -19,7 +19,7 @@ class IoTrace;
 using BusResources = std::map<int, std::string>;
 
 // Parses "11=TCPIP0::127.0.0.1::5025::SOCKET,12=GPIB0::12::INSTR" (entries separated by commas or
-// blanks). Throws std::invalid_argument with a clear message for malformed text.
+// blanks). Throws std::invalid_argument naming the entry and what was expected for malformed text.
 BusResources parseBusResources(std::string_view text);
 
 // A bus whose openDevice(0, N, ...) reaches the resource given for address N. Addresses without a

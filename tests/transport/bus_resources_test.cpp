@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <stdexcept>
 #include <utility>
 #include <vector>
@@ -10,6 +11,15 @@
 
 namespace zp {
 namespace {
+
+std::string errorText(const std::function<void()>& call) {
+    try {
+        call();
+    } catch (const std::exception& e) {
+        return e.what();
+    }
+    return "<no error>";
+}
 
 using transport::GpibResource;
 using transport::parseResource;
@@ -39,9 +49,9 @@ TEST(ParseBusResources, BadInputNamesTheProblem) {
         {"11=GPIB0::1::INSTR,11=GPIB0::2::INSTR", "more than once"},
         {"11=TCPIP0::host::99999::SOCKET", "port"},
         {"11=TCPIP0::host::SOCKET", "host and port"},
-        {"11=TCPIP0::ho st::5025::SOCKET", "Bad resource"},
-        {"11=USB0::1::2::INSTR", "unknown interface"},
-        {"11=GPIB0::31::INSTR", "0..30"},
+        {"11=TCPIP0::ho$t::5025::SOCKET", "must be a name or an IPv4 address"},
+        {"11=USB0::1::2::INSTR", "unknown interface \"USB0\""},
+        {"11=GPIB0::31::INSTR", "0 to 30"},
         {"11=GPIB0::5::SOCKET", "INSTR"},
     };
     for (const auto& [text, mentions] : cases) {
@@ -55,6 +65,50 @@ TEST(ParseBusResources, BadInputNamesTheProblem) {
     EXPECT_THROW(transport::ResourceBus({{11, "GPIB0::99::INSTR"}}), std::invalid_argument);
 }
 
+TEST(ParseBusResources, RefusalNamesTheEntryAndWhatWasExpected) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"11=GPIB-1::5::INSTR",
+         "the board number after GPIB must be digits, as in GPIB0, not \"-1\""},
+        {"11=GPIBx::5::INSTR",
+         "the board number after GPIB must be digits, as in GPIB0, not \"x\""},
+        {"11=TCPIP-7::host::5025::SOCKET",
+         "the board number after TCPIP must be digits, as in TCPIP0, not \"-7\""},
+        {"11=TCPIP0::::5025::SOCKET",
+         "the host is empty; expected a name, an IPv4 address or an IPv6 address in brackets "
+         "([::1])"},
+        {"11=TCPIP0::host::::SOCKET", "the port must be a number from 1 to 65535, not \"\""},
+        {"11=TCPIP0::host::+5025::SOCKET",
+         "the port must be a number from 1 to 65535, not \"+5025\""},
+        {"11=GPIB0::-3::INSTR", "the GPIB address must be a number from 0 to 30, not \"-3\""},
+        {"11=TCPIP0::gw::gpib0,,,,::INSTR",
+         "device \"gpib0,,,,\" must be NAME, NAME,N or NAME,N,S with numbers N and S (gpib0,12)"},
+        {"11=TCPIP0::gw::gpib0,5,::INSTR",
+         "device \"gpib0,5,\" must be NAME, NAME,N or NAME,N,S with numbers N and S (gpib0,12)"},
+        {"11=TCPIP0::::1::5025::SOCKET",
+         "the host is empty; expected a name, an IPv4 address or an IPv6 address in brackets "
+         "([::1])"},
+        {"11=TCPIP0::fe80:1::5025::SOCKET",
+         "an IPv6 address must be written in brackets, as in [::1], not \"fe80:1\""},
+        {"11=TCPIP0::[::g]::5025::SOCKET",
+         "host \"[::g]\" is not an IPv6 address in brackets, as in [::1]"},
+        {"11=TCPIP0::[::1::5025::SOCKET",
+         "host \"[\" is not an IPv6 address in brackets, as in [::1]"},
+        {"11=TCPIP0::[::1]::INSTR",
+         "VXI-11 is reached over IPv4 only; give the host's IPv4 address or name"},
+    };
+    for (const auto& [text, reason] : cases) {
+        try {
+            parseBusResources(text);
+            ADD_FAILURE() << "accepted: " << text;
+        } catch (const std::invalid_argument& e) {
+            EXPECT_EQ(std::string(e.what()), "Bus entry \"" + std::string(text) + "\": " + reason);
+        }
+    }
+    EXPECT_EQ(errorText([] { parseResource("GPIB-1::5::INSTR"); }),
+              "Bad resource \"GPIB-1::5::INSTR\": the board number after GPIB must be digits, as "
+              "in GPIB0, not \"-1\"");
+}
+
 TEST(ParseResource, Kinds) {
     const auto socket = std::get<SocketResource>(parseResource("tcpip0::127.0.0.1::5025::socket"));
     EXPECT_EQ(socket.host + ":" + std::to_string(socket.port), "127.0.0.1:5025");
@@ -65,6 +119,11 @@ TEST(ParseResource, Kinds) {
     EXPECT_EQ(std::vector<int>({gpib.board, gpib.primary, gpib.secondary}),
               std::vector<int>({1, 22, 3}));
     EXPECT_EQ(std::get<GpibResource>(parseResource("GPIB::4::INSTR")).secondary, -1);
+    const auto ipv6 =
+        std::get<SocketResource>(parseResource("TCPIP0::[fe80::1%eth0]::5025::SOCKET"));
+    EXPECT_EQ(ipv6.host, "fe80::1%eth0");
+    EXPECT_EQ(std::get<Vxi11Resource>(parseResource("TCPIP0::gw::gpib0,7,3::INSTR")).device,
+              "gpib0,7,3");
 }
 
 }  // namespace

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "instruments/error_capture.h"
+#include "instruments/instrument_bus.h"
 #include "instruments/instrument_error.h"
 #include "instruments/io_trace.h"
 #include "transport/transport_factory.h"
@@ -91,6 +92,28 @@ TEST_F(GpibBusTest, DriverTimeoutAndNoListenerMapOntoTheStatusWord) {
     bus->writeText(nobody, "*IDN?\n");
     EXPECT_EQ(bus->status(), kErr);
     EXPECT_EQ(trace.lines().back(), "BUS 29 error ibwrt: no listener");
+}
+
+TEST_F(GpibBusTest, RestOfALongReplyIsReadOffBeforeTheNextWrite) {
+    // Left on the device, the next write would make it queue -410 "Query INTERRUPTED".
+    auto bus = makeTransportBus({{12, "GPIB0::12::INSTR"}}, &trace);
+    const auto d = openGenerator(*bus, 12);
+    const std::string echo(149, 'e');
+    bus->writeText(d, "ECHO? " + echo + "\n");
+    std::string buffer(100, ' ');
+    bus->readText(d, buffer);
+    EXPECT_EQ(errorOf([&] { checkInstrumentError(*bus, d, 12); }), "<no error>");
+    const auto lines = trace.lines();
+    EXPECT_EQ(std::vector<std::string>(lines.end() - 4, lines.end()),
+              (std::vector<std::string>{"BUS 12 R \"" + echo.substr(0, 100) + "\"",
+                                        "BUS 12 drained 50 bytes", "BUS 12 W \":SYST:ERR?\\n\"",
+                                        "BUS 12 R \"+0,\\\"No error\\\"\\n\""}));
+    // After a device clear the device holds nothing more, so nothing is read off.
+    bus->writeText(d, "ECHO? " + echo + "\n");
+    bus->readText(d, buffer);
+    bus->clearDevice(d);
+    bus->writeText(d, "*IDN?\n");
+    EXPECT_EQ(trace.lines().size(), lines.size() + 4);  // W, R, clear, W: no "drained" line
 }
 
 TEST_F(GpibBusTest, ClearDropsThePendingReplyAndDevicesGoOfflineWithTheBus) {

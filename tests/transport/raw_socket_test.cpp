@@ -10,6 +10,7 @@
 #include "instruments/error_capture.h"
 #include "instruments/instrument_error.h"
 #include "instruments/io_trace.h"
+#include "scripted_peer.h"
 #include "transport/transport_factory.h"
 #include "transport_test_util.h"
 
@@ -91,6 +92,26 @@ TEST(RawSocket, RefusedConnectNamesHostAndPortAndClosedPeerIsAnError) {
     }
 }
 
+TEST(RawSocket, BracketedIpv6ResourceReachesTheLoopback) {
+    ScriptedPeer peer(
+        [](ScriptedPeer& p, int fd) {
+            if (p.readLine(fd) == "*OPC?\n") p.sendText(fd, "1\n");
+            p.pause(10s);
+        },
+        AF_INET6);
+    if (!peer.listening()) GTEST_SKIP() << "this machine has no IPv6 loopback (::1)";
+    auto bus = makeTransportBus(
+        {{11, "TCPIP0::[::1]::" + std::to_string(peer.port()) + "::SOCKET"}}, nullptr);
+    const auto d = bus->openDevice(0, 11, 0, 11, 1, 0);
+    bus->writeText(d, "*OPC?\n");
+    std::string buffer(100, ' ');
+    bus->readText(d, buffer);
+    EXPECT_EQ(buffer, "1\n");
+    const int port = unusedPort();
+    EXPECT_EQ(errorOf([&] { RawSocketLink("::1", port, 1s); }),
+              "Cannot connect to [::1]:" + std::to_string(port) + ": Connection refused");
+}
+
 class TransportBusTest : public ::testing::Test {
   protected:
     LoopbackBench bench;
@@ -126,17 +147,31 @@ TEST_F(TransportBusTest, IdentificationAndProgrammingThroughTheBus) {
                              }));
 }
 
-TEST_F(TransportBusTest, TimeoutSetsErrAndTimoAndKeepsTheBuffer) {
+TEST_F(TransportBusTest, TimeoutSetsErrAndTimoKeepsTheBufferAndClosesUntilCleared) {
     const auto d = bus->openDevice(0, 11, 0, 9, 1, 0);  // code 9: 100 ms
     bus->writeText(d, "SILENT?\n");
     EXPECT_EQ(read(d), std::string(100, ' '));
     EXPECT_EQ(bus->status(), kErr | kTimo);
     EXPECT_EQ(trace.lines().back(), "BUS 11 timeout");
+    // A late reply must not pass for the next one: the link stays closed until cleared.
     bus->writeText(d, "*OPC?\n");
-    EXPECT_EQ(bus->status(), 0) << "the next good call clears the status";
+    EXPECT_EQ(bus->status(), kErr);
+    bus->clearDevice(d);
+    EXPECT_EQ(bus->status(), 0);
+    bus->writeText(d, "*OPC?\n");
+    EXPECT_EQ(read(d), "1\n");
     bus->writeText(42, "*IDN?\n");
     EXPECT_EQ(bus->status(), kErr);
     EXPECT_EQ(bus->addressOf(42), -1);
+}
+
+TEST_F(TransportBusTest, OpeningAgainReconnectsALinkThatAFailureClosed) {
+    const auto d = bus->openDevice(0, 12, 0, 9, 1, 0);
+    bus->writeText(d, "SILENT?\n");
+    read(d);
+    const auto again = bus->openDevice(0, 12, 0, 9, 1, 0);
+    bus->writeText(d, "*OPC?\n");  // the older descriptor uses the new connection too
+    EXPECT_EQ(read(again), "1\n");
 }
 
 TEST_F(TransportBusTest, AddressWithoutResourceAndUnreachableResourceThrow) {

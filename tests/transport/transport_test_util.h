@@ -13,7 +13,7 @@
 namespace zp::testing {
 
 // Generators 11 and 12 served on free ports; "BIG?" answers 4 MiB of pattern text and
-// "SILENT?" nothing.
+// "SILENT?" nothing. Generator 11 may be given its own identification.
 struct LoopbackBench {
     static constexpr std::size_t kBigSize = 4u << 20;
     static std::string bigReply() {
@@ -23,8 +23,8 @@ struct LoopbackBench {
         return text;
     }
 
-    LoopbackBench() {
-        generators[11] = std::make_unique<sim::SimGenerator>(11, "");
+    explicit LoopbackBench(std::string identity11 = "") {
+        generators[11] = std::make_unique<sim::SimGenerator>(11, std::move(identity11));
         generators[12] = std::make_unique<sim::SimGenerator>(12, "");
         auto forward = sim::ScpiServer::forGenerators(generators);
         server = std::make_unique<sim::ScpiServer>(

@@ -1,10 +1,13 @@
 // A stand-in for the GPIB driver library, loaded by the transport tests at run time.
 // Devices: address 29 has no listener; every other address answers "*IDN?" with
-// "FAKE,GPIB,<address>,1" and "ECHO? text" with the text; other queries get no reply.
-// The state is per process, as in a real driver.
+// "FAKE,GPIB,<address>,1", "ECHO? text" with the text and ":SYST:ERR?" with its error queue;
+// other queries get no reply. A write while a reply is still unread discards the reply and
+// queues -410 "Query INTERRUPTED", as a real instrument does. The state is per process, as in a
+// real driver.
 
 #include <algorithm>
 #include <cstring>
+#include <deque>
 #include <map>
 #include <string>
 
@@ -21,6 +24,7 @@ struct Driver {
     int err = 0;
     long cntl = 0;
     std::map<int, std::string> pending;  // per descriptor
+    std::map<int, std::deque<std::string>> errors;
     std::map<int, int> online;
     std::string lastWrite;
     int lastTimeoutCode = -1;
@@ -62,12 +66,16 @@ int ibwrt(int ud, const void* data, long count) {
     std::string text(static_cast<const char*>(data), static_cast<std::size_t>(count));
     driver().lastWrite = text;
     while (!text.empty() && (text.back() == '\n' || text.back() == '\r')) text.pop_back();
-    if (text == "*IDN?") {
+    if (driver().pending.erase(ud) != 0)
+        driver().errors[ud].push_back("-410,\"Query INTERRUPTED\"");
+    if (text == ":SYST:ERR?") {
+        auto& queue = driver().errors[ud];
+        driver().pending[ud] = (queue.empty() ? "+0,\"No error\"" : queue.front()) + "\n";
+        if (!queue.empty()) queue.pop_front();
+    } else if (text == "*IDN?") {
         driver().pending[ud] = "FAKE,GPIB," + std::to_string(address(ud)) + ",1\n";
     } else if (text.rfind("ECHO? ", 0) == 0) {
         driver().pending[ud] = text.substr(6) + "\n";
-    } else if (text.find('?') != std::string::npos) {
-        driver().pending.erase(ud);
     }
     driver().sta = kCmpl;
     driver().cntl = count;
