@@ -1,12 +1,13 @@
 // The programs as real processes: exit statuses, what they print, the second-start hand-over.
 
 #include <gtest/gtest.h>
+#include <sys/socket.h>
+#include <sys/un.h>
 #include <unistd.h>
 
 #include <chrono>
 #include <cstdlib>
 #include <filesystem>
-#include <thread>
 
 #include "child_process.h"
 #include "lib/bench_options.h"
@@ -20,6 +21,7 @@ namespace fs = std::filesystem;
 const std::string kCli = ZP_CLI_PATH;
 const std::string kGui = ZP_GUI_PATH;
 const char* kUnreachable = "analyzer:Application.modelText=-999 Analyzer not responding";
+const char* kListening = "zentra-pulse: listening for a second start\n";
 
 bool haveGui() {
     return fs::exists(kGui);
@@ -27,6 +29,20 @@ bool haveGui() {
 
 fs::path scratch(const std::string& name) {
     return fs::temp_directory_path() / ("zp-app-test-" + std::to_string(getpid()) + "-" + name);
+}
+
+// A fresh instance key every time: a repeated test in the same process, or a reused process id,
+// must never meet an instance or socket file of an earlier run.
+std::string uniqueKey() {
+    static int serial = 0;
+    return "zp-test-" + std::to_string(getpid()) + "-" + std::to_string(++serial) + "-" +
+           std::to_string(std::chrono::system_clock::now().time_since_epoch().count() % 1000000007);
+}
+
+// Where the window program's instance socket lies (Qt puts it in the temporary folder).
+fs::path instanceSocket(const std::string& key) {
+    const char* tmp = std::getenv("TMPDIR");
+    return fs::path(tmp && *tmp ? tmp : "/tmp") / key;
 }
 
 Env guiEnv(const std::string& key) {
@@ -78,21 +94,44 @@ TEST(CliProgram, UnreachableAnalyzerEndsWithOneClearLine) {
 
 TEST(GuiProgram, SecondStartHandsOverToTheRunningOneAndEnds) {
     if (!haveGui()) GTEST_SKIP() << "built without the window program";
-    const std::string key = "zp-test-" + std::to_string(getpid());
+    const std::string key = uniqueKey();
     RunningProgram first(kGui, {}, guiEnv(key));
-    // The first start is ready once its socket exists.
-    const char* tmp = std::getenv("TMPDIR");
-    const fs::path socket = fs::path(tmp && *tmp ? tmp : "/tmp") / key;
-    for (int i = 0; i < 200 && !fs::exists(socket); ++i) std::this_thread::sleep_for(50ms);
-    ASSERT_TRUE(fs::exists(socket)) << first.err();
+    ASSERT_TRUE(first.waitForErr(kListening, 20s)) << first.err();
 
     const auto started = std::chrono::steady_clock::now();
     RunResult second = runProgram(kGui, {}, guiEnv(key), 10s);
     EXPECT_EQ(second.status, 0) << second.err;
     EXPECT_LT(std::chrono::steady_clock::now() - started, 5s);
+    EXPECT_EQ(second.err.find(kListening), std::string::npos) << second.err;
     EXPECT_TRUE(first.waitForErr("zentra-pulse: raised by a second start", 10s)) << first.err();
     EXPECT_TRUE(first.running());
-    first.stop();
+    // SIGTERM closes it cleanly, and its socket file goes with it.
+    EXPECT_EQ(first.stop(), 0) << first.err();
+    EXPECT_FALSE(fs::exists(instanceSocket(key)));
+}
+
+TEST(GuiProgram, ASocketFileLeftByACrashedRunDoesNotBlockANewStart) {
+    if (!haveGui()) GTEST_SKIP() << "built without the window program";
+    const std::string key = uniqueKey();
+    // A bound socket closed without unlinking: what a killed instance leaves behind.
+    {
+        const int fd = socket(AF_UNIX, SOCK_STREAM, 0);
+        ASSERT_GE(fd, 0);
+        sockaddr_un address{};
+        address.sun_family = AF_UNIX;
+        const std::string path = instanceSocket(key).string();
+        ASSERT_LT(path.size(), sizeof address.sun_path);
+        path.copy(address.sun_path, path.size());
+        ASSERT_EQ(bind(fd, reinterpret_cast<const sockaddr*>(&address), sizeof address), 0);
+        close(fd);
+        ASSERT_TRUE(fs::exists(path));
+    }
+    RunningProgram first(kGui, {}, guiEnv(key));
+    ASSERT_TRUE(first.waitForErr(kListening, 20s)) << first.err();
+    EXPECT_EQ(runProgram(kGui, {}, guiEnv(key), 10s).status, 0);
+    EXPECT_TRUE(first.waitForErr("zentra-pulse: raised by a second start", 10s)) << first.err();
+    EXPECT_EQ(first.stop(), 0);
+    EXPECT_FALSE(fs::exists(instanceSocket(key)));
 }
 
 TEST(GuiProgram, UnreachableAnalyzerEndsWithStatusOne) {
@@ -100,7 +139,7 @@ TEST(GuiProgram, UnreachableAnalyzerEndsWithStatusOne) {
     const fs::path png = scratch("never.png");
     // The screenshot run is unattended: its message goes to stderr instead of a box.
     RunResult r = runProgram(kGui, {"--screenshot", png.string(), "--fault", kUnreachable},
-                             guiEnv("zp-test-unreachable-" + std::to_string(getpid())));
+                             guiEnv(uniqueKey()));
     EXPECT_EQ(r.status, 1);
     EXPECT_NE(r.err.find("The analyzer cannot be reached: -999 Analyzer not responding"),
               std::string::npos)

@@ -7,9 +7,12 @@
 #include <QFile>
 #include <QTemporaryDir>
 #include <QTextBrowser>
+#include <QTimer>
+#include <csignal>
 
 #include "ui/help_viewer.h"
 #include "ui/single_instance.h"
+#include "ui/stop_signals.h"
 #include "ui_test_support.h"
 
 namespace zp::ui::testing {
@@ -110,6 +113,27 @@ TEST(SingleInstance, KeyIsNamedAfterTheUserUnlessOverridden) {
     qputenv("ZP_INSTANCE_KEY", "custom-key");
     EXPECT_EQ(SingleInstance::defaultKey(), "custom-key");
     qunsetenv("ZP_INSTANCE_KEY");
+}
+
+TEST(StopSignals, SigtermAndSigintEndTheEventLoopInsteadOfTheProcess) {
+    application();
+    struct sigaction before {};
+    sigaction(SIGTERM, nullptr, &before);
+    for (const int signal : {SIGTERM, SIGINT}) {
+        const StopSignals stop;
+        EXPECT_THROW(StopSignals(), std::logic_error);
+        EXPECT_EQ(stop.received(), 0);
+        std::raise(signal);
+        // Give up with 7 when the stop never reaches the loop.
+        QTimer giveUp;
+        giveUp.callOnTimeout([] { QCoreApplication::exit(7); });
+        giveUp.start(5000);
+        EXPECT_EQ(QCoreApplication::exec(), 0);
+        EXPECT_EQ(stop.received(), signal);
+    }
+    struct sigaction after {};
+    sigaction(SIGTERM, nullptr, &after);
+    EXPECT_EQ(after.sa_handler, before.sa_handler) << "the previous handler must come back";
 }
 
 }  // namespace
