@@ -5,6 +5,8 @@
 #include <QCursor>
 #include <QDir>
 #include <QFile>
+#include <QLabel>
+#include <QMessageBox>
 #include <QTemporaryDir>
 #include <QTextBrowser>
 #include <QTimer>
@@ -47,6 +49,47 @@ TEST(QtInteraction, BusyPointerNeverStacksAndAlwaysComesBack) {
         other.setPointer(Pointer::Busy);
     }
     EXPECT_EQ(QApplication::overrideCursor(), nullptr);
+}
+
+// What a message box showed, read while it is up; then `press` closes it.
+struct ShownBox {
+    bool seen = false;
+    Qt::TextFormat format = Qt::AutoText;
+    QString text;
+};
+
+std::unique_ptr<QTimer> answerNextBox(ShownBox& shown, QMessageBox::StandardButton press) {
+    auto timer = std::make_unique<QTimer>();
+    QObject::connect(timer.get(), &QTimer::timeout, [&shown, press] {
+        for (QWidget* w : QApplication::topLevelWidgets()) {
+            auto* box = qobject_cast<QMessageBox*>(w);
+            if (box == nullptr || !box->isVisible()) continue;
+            const auto* label = box->findChild<QLabel*>(QStringLiteral("qt_msgbox_label"));
+            shown = {true, label ? label->textFormat() : Qt::AutoText, label ? label->text() : ""};
+            box->done(press);
+        }
+    });
+    timer->start(10);
+    return timer;
+}
+
+TEST(QtInteraction, BoxesShowInstrumentTextAsPlainTextNeverAsMarkup) {
+    application();
+    QtInteraction ui({});
+    const std::string reply = "<img src=\"file:///etc/hosts\"><b>-113</b> Undefined header";
+    for (const bool question : {false, true}) {
+        SCOPED_TRACE(question ? "ask" : "message");
+        ShownBox shown;
+        const auto answering = answerNextBox(shown, QMessageBox::Yes);
+        if (question) {
+            EXPECT_TRUE(ui.ask(reply));
+        } else {
+            ui.message(reply);
+        }
+        ASSERT_TRUE(shown.seen);
+        EXPECT_EQ(shown.format, Qt::PlainText);
+        EXPECT_EQ(shown.text.toStdString(), reply);
+    }
 }
 
 class HelpFiles : public ::testing::Test {
