@@ -65,31 +65,68 @@ TEST(CliProgram, SetsCalculatesAndShowsOnAFourPortAnalyzer) {
 }
 
 TEST(CliProgram, FailuresEndWithStatusOneAndAReasonOnStderr) {
-    RunResult bad = runProgram(kCli, {"frobnicate"});
-    EXPECT_EQ(bad.status, 1);
-    EXPECT_NE(bad.err.find("unknown action 'frobnicate'"), std::string::npos) << bad.err;
-
     RunResult refused = runProgram(kCli, {"set", "prf", "1G", "show"});
     EXPECT_EQ(refused.status, 1);
     EXPECT_NE(refused.err.find("zentra-pulse-cli: set prf 1G: "), std::string::npos) << refused.err;
     EXPECT_EQ(refused.out.find('{'), std::string::npos) << "show must not run after a failure";
 }
 
-TEST(CliProgram, ListsModelsAndRefusesABadCommandLine) {
+TEST(CliProgram, ListsModelsAndRefusesABadCommandLineWithStatusTwo) {
     RunResult r = runProgram(kCli, {"--list-models"});
     ASSERT_EQ(r.status, 0);
     EXPECT_EQ(r.out, zp::app::modelListText());
-    RunResult bad = runProgram(kCli, {"--analyzer", "sim:kt999", "show"});
-    EXPECT_EQ(bad.status, 2);
-    EXPECT_NE(bad.err.find("zentra-pulse-cli: unknown analyzer model 'kt999'"), std::string::npos);
+    // arguments -> the reason line; the usage hint follows it, nothing runs
+    const std::pair<std::vector<std::string>, std::string> cases[] = {
+        {{"--analyzer", "sim:kt999", "show"}, "unknown analyzer model 'kt999' (see --list-models)"},
+        {{"frobnicate"}, "unknown action 'frobnicate' (actions: set, step, calculate, show, help)"},
+        {{"show", "set", "prf"}, "set prf: missing value"},
+    };
+    for (const auto& [args, reason] : cases) {
+        const RunResult bad = runProgram(kCli, args);
+        EXPECT_EQ(bad.status, 2) << reason;
+        EXPECT_EQ(bad.err, "zentra-pulse-cli: " + reason + "\nTry 'zentra-pulse-cli --help'.\n");
+        EXPECT_EQ(bad.out, "");
+    }
 }
 
-TEST(CliProgram, UnreachableAnalyzerEndsWithOneClearLine) {
-    RunResult r = runProgram(kCli, {"--fault", kUnreachable, "show"});
-    EXPECT_EQ(r.status, 1);
-    EXPECT_EQ(r.err,
-              "zentra-pulse-cli: the analyzer cannot be reached: -999 Analyzer not responding\n");
-    EXPECT_EQ(r.out, "");
+TEST(CliProgram, AnalyzerFailuresAreReportedOnOneLineWithTheAnalyzersWords) {
+    struct Case {
+        std::vector<std::string> args;
+        std::string out;
+        std::string err;
+    };
+    const Case cases[] = {
+        {{"--fault", kUnreachable, "show"},
+         "",
+         "zentra-pulse-cli: the analyzer cannot be reached: -999 Analyzer not responding\n"},
+        // Line breaks in the analyzer's description must not break the one line scripts read.
+        {{"--fault", "analyzer:Application.modelText=-999 Analyzer\nnot\r\nresponding", "show"},
+         "",
+         "zentra-pulse-cli: the analyzer cannot be reached: -999 Analyzer not responding\n"},
+        // The help query failing says why, not that no file was named.
+        {{"--fault", "analyzer:CommandParser.parse=-113 Undefined header", "help"},
+         "message: -113 Undefined header\n",
+         "zentra-pulse-cli: help: -113 Undefined header\n"},
+    };
+    for (const Case& c : cases) {
+        const RunResult r = runProgram(kCli, c.args);
+        EXPECT_EQ(r.status, 1) << c.err;
+        EXPECT_EQ(r.err, c.err);
+        EXPECT_EQ(r.out, c.out);
+    }
+}
+
+TEST(CliProgram, OutputThatCannotBeWrittenIsAFailure) {
+    if (!fs::exists("/dev/full")) GTEST_SKIP() << "no /dev/full here";
+    const RunResult out = runProgramWithStdout(kCli, {"show"}, "/dev/full");
+    EXPECT_EQ(out.status, 1);
+    EXPECT_EQ(out.err, "zentra-pulse-cli: show: cannot write the output\n");
+
+    // The trace fails while the window starts, so no action runs without it.
+    const RunResult trace = runProgram(kCli, {"--trace-io", "/dev/full", "show"});
+    EXPECT_EQ(trace.status, 1);
+    EXPECT_EQ(trace.err, "zentra-pulse-cli: start-up: cannot write the I/O trace file\n");
+    EXPECT_EQ(trace.out, "");
 }
 
 TEST(GuiProgram, SecondStartHandsOverToTheRunningOneAndEnds) {
