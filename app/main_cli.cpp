@@ -28,8 +28,9 @@ int main(int argc, char** argv) {
     try {
         actions = parseActions(cmd.rest);
     } catch (const ActionError& e) {
-        std::cerr << "zentra-pulse-cli: " << e.what() << '\n';
-        return 1;
+        std::cerr << "zentra-pulse-cli: " << ConsoleInteraction::oneLine(e.what())
+                  << "\nTry 'zentra-pulse-cli --help'.\n";
+        return kUsageExit;
     }
 
     const std::unique_ptr<zp::sim::SimBench> bench =
@@ -41,13 +42,18 @@ int main(int argc, char** argv) {
     try {
         form.Form_Load();
     } catch (const zp::InstrumentError& e) {
-        std::cerr << "zentra-pulse-cli: the analyzer cannot be reached: " << e.description()
-                  << '\n';
+        std::cerr << "zentra-pulse-cli: the analyzer cannot be reached: "
+                  << ConsoleInteraction::oneLine(e.description()) << '\n';
         return 1;
     } catch (const std::exception& e) {
-        std::cerr << "zentra-pulse-cli: start-up failed: " << e.what() << '\n';
+        std::cerr << "zentra-pulse-cli: start-up failed: " << ConsoleInteraction::oneLine(e.what())
+                  << '\n';
         return 1;
     }
-    ActionContext ctx{form, ui, std::cout};
+    ActionContext ctx{form, ui, std::cout, bench->trace()};
+    if (const std::string lost = lostOutput(ctx); !lost.empty()) {
+        std::cerr << "zentra-pulse-cli: start-up: " << lost << '\n';
+        return 1;
+    }
     return runActions(actions, ctx, std::cerr);
 }

@@ -16,6 +16,7 @@
 #include "ui/main_window.h"
 #include "ui/qt_interaction.h"
 #include "ui/single_instance.h"
+#include "ui/stop_signals.h"
 
 namespace {
 
@@ -41,6 +42,8 @@ int main(int argc, char** argv) {
     QApplication app(argc, argv);
     QApplication::setApplicationName(QStringLiteral("zentra-pulse"));
     QApplication::setApplicationVersion(QStringLiteral(ZP_VERSION));
+    // SIGTERM and SIGINT close the program like its window does, so the instance socket goes too.
+    const zp::ui::StopSignals stopSignals;
 
     // A second start hands over before anything else runs. A screenshot run stands alone.
     zp::ui::SingleInstance instance(zp::ui::SingleInstance::defaultKey());
@@ -72,6 +75,10 @@ int main(int argc, char** argv) {
         window.bringToFront();
     });
     window.show();
+    // From here a second start is heard and answered: scripts and tests wait for this line.
+    if (instance.listening()) {
+        std::cerr << "zentra-pulse: listening for a second start" << std::endl;
+    }
 
     if (options.screenshot) {
         const QString file = QString::fromStdString(*options.screenshot);
@@ -81,5 +88,6 @@ int main(int argc, char** argv) {
             QApplication::exit(saved ? 0 : 1);
         });
     }
+    if (stopSignals.received() != 0) return 0;
     return QApplication::exec();
 }

@@ -219,7 +219,11 @@ Action parseHelp(WordCursor&) {
     return plainAction("help", [](ActionContext& ctx) {
         ctx.form.m_contents_Click();
         std::optional<ConsoleInteraction::HelpRequest> request = ctx.ui.takeHelpRequest();
-        if (!request) throw ActionError("the analyzer did not name a help file");
+        // Without a file the window has said why in a message, and that message is the failure.
+        if (!request && ctx.ui.hasMessages()) return std::string();
+        if (!request || request->file.empty()) {
+            throw ActionError("the analyzer did not name a help file");
+        }
         return "help -> " + request->file + " (topic " + std::to_string(request->topic) + ")";
     });
 }
@@ -277,14 +281,23 @@ int runActions(const std::vector<Action>& actions, ActionContext& ctx, std::ostr
         if (failure.empty() && action.messageFails && !messages.empty()) {
             for (const std::string& m : messages) failure += (failure.empty() ? "" : "; ") + m;
         }
+        if (failure.empty() && !echo.empty()) ctx.out << echo << '\n';
+        if (failure.empty()) failure = lostOutput(ctx);
         if (!failure.empty()) {
             ctx.out.flush();
-            err << "zentra-pulse-cli: " << action.words << ": " << failure << '\n';
+            err << "zentra-pulse-cli: " << action.words << ": "
+                << ConsoleInteraction::oneLine(failure) << '\n';
             return 1;
         }
-        if (!echo.empty()) ctx.out << echo << '\n';
     }
     return 0;
+}
+
+std::string lostOutput(ActionContext& ctx) {
+    // Flushed action by action, so a script reading along sees each echo as it happens.
+    if (!ctx.out.flush()) return "cannot write the output";
+    if (ctx.trace != nullptr && ctx.trace->fileFailed()) return "cannot write the I/O trace file";
+    return {};
 }
 
 }  // namespace zp::app

@@ -10,6 +10,7 @@
 
 #include "console_interaction.h"
 #include "forms/main_form.h"
+#include "instruments/io_trace.h"
 
 namespace zp::app {
 
@@ -23,6 +24,7 @@ struct ActionContext {
     MainForm& form;
     ConsoleInteraction& ui;
     std::ostream& out;
+    const IoTrace* trace = nullptr;  // the bench's, when its file must keep up
 };
 
 // One parsed action, ready to run.
@@ -61,7 +63,12 @@ const std::vector<ActionKind>& actionTable();
 std::vector<Action> parseActions(const std::vector<std::string>& words);
 
 // Runs the actions in order and echoes each on `ctx.out`. The first failure is printed on `err`
-// as "zentra-pulse-cli: <action>: <reason>" and ends the run; returns the exit status (0 or 1).
+// as "zentra-pulse-cli: <action>: <reason>" (one line) and ends the run; returns the exit status
+// (0 or 1). Output that cannot be written is a failure of the action that wrote it.
 int runActions(const std::vector<Action>& actions, ActionContext& ctx, std::ostream& err);
+
+// Why the run's output is lost, empty while it is not: `ctx.out` (flushed to find out) or the
+// trace file cannot be written.
+std::string lostOutput(ActionContext& ctx);
 
 }  // namespace zp::app

@@ -30,6 +30,7 @@ class ConsoleInteraction : public Interaction {
 
     // Messages shown since the last takeMessages(); an action uses them to tell failure.
     std::vector<std::string> takeMessages();
+    bool hasMessages() const { return !messages_.empty(); }
 
     struct HelpRequest {
         std::string file;
@@ -37,6 +38,7 @@ class ConsoleInteraction : public Interaction {
     };
     std::optional<HelpRequest> takeHelpRequest();
 
+    // Line breaks become blanks: every report of this front end is one line.
     static std::string oneLine(const std::string& text);
 
   private:

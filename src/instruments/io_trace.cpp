@@ -100,6 +100,11 @@ void IoTrace::openFile(const std::string& path) {
     file_ = std::move(file);
 }
 
+bool IoTrace::fileFailed() const {
+    std::lock_guard lock(mutex_);
+    return file_.is_open() && !file_.good();
+}
+
 void IoTrace::add(std::string line) {
     std::lock_guard lock(mutex_);
     if (file_.is_open()) {

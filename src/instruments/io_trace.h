@@ -28,6 +28,8 @@ class IoTrace {
     void clear();
     // Also appends every line to this file from now on; throws std::runtime_error if it can't.
     void openFile(const std::string& path);
+    // True once a line could not be written to that file (a full disk, say).
+    bool fileFailed() const;
 
     // Quoting used by the trace: C-style escapes for control characters, quotes and backslashes.
     static std::string quote(std::string_view text);

@@ -9,6 +9,18 @@
 #include <iostream>
 
 namespace zp::ui {
+namespace {
+
+// Instrument replies and file contents reach these boxes: they are shown as written, never as
+// markup (a reply holding <img src=...> must not load anything).
+QMessageBox::StandardButton showBox(QWidget* parent, QMessageBox::Icon icon, const QString& text,
+                                    QMessageBox::StandardButtons buttons) {
+    QMessageBox box(icon, QString::fromUtf8(kAppTitle), text, buttons, parent);
+    box.setTextFormat(Qt::PlainText);
+    return static_cast<QMessageBox::StandardButton>(box.exec());
+}
+
+}  // namespace
 
 QString qtFileFilter(const std::string& filter) {
     const QStringList parts = QString::fromStdString(filter).split(QLatin1Char('|'));
@@ -46,9 +58,7 @@ void QtInteraction::message(const std::string& text) {
     // The person must be able to read it: the busy pointer gives way while the box is up.
     const Pointer saved = pointer_;
     setPointer(Pointer::Normal);
-    QMessageBox box(QMessageBox::Information, QString::fromUtf8(kAppTitle), lastMessage_,
-                    QMessageBox::Ok, window_);
-    box.exec();
+    showBox(window_, QMessageBox::Information, lastMessage_, QMessageBox::Ok);
     setPointer(saved);
 }
 
@@ -59,9 +69,9 @@ bool QtInteraction::ask(const std::string& text) {
     }
     const Pointer saved = pointer_;
     setPointer(Pointer::Normal);
-    const auto answer =
-        QMessageBox::question(window_, QString::fromUtf8(kAppTitle), QString::fromStdString(text),
-                              QMessageBox::Yes | QMessageBox::No);
+    const QMessageBox::StandardButton answer =
+        showBox(window_, QMessageBox::Question, QString::fromStdString(text),
+                QMessageBox::Yes | QMessageBox::No);
     setPointer(saved);
     return answer == QMessageBox::Yes;
 }

@@ -48,6 +48,10 @@ SingleInstance::Role SingleInstance::start() {
     return Role::Primary;
 }
 
+bool SingleInstance::listening() const {
+    return server_ != nullptr && server_->isListening();
+}
+
 void SingleInstance::onNewConnection() {
     while (QLocalSocket* socket = server_->nextPendingConnection()) {
         // Only the one known message counts; anything else is dropped unread.

@@ -1,6 +1,7 @@
 #pragma once
 // One running program per user: the first start listens on a local socket named after the user,
-// a second start tells it to come to the front and ends.
+// a second start tells it to come to the front and ends. The socket file goes when this object
+// does; one left by a crashed run is taken over.
 
 #include <QObject>
 #include <QString>
@@ -21,6 +22,8 @@ class SingleInstance : public QObject {
     // Hands over to a running instance (Secondary: the caller ends at once) or starts listening
     // (Primary). A listening failure leaves this start running on its own.
     Role start();
+    // True once start() made this the instance a second start hands over to.
+    bool listening() const;
 
     // "zentra-pulse-<user>"; ZP_INSTANCE_KEY replaces it (tests run side by side).
     static QString defaultKey();

@@ -47,29 +47,21 @@ bool readSome(int fd, std::string& into) {
     return true;
 }
 
-}  // namespace
-
-RunResult runProgram(const std::string& program, const std::vector<std::string>& args,
-                     const Env& env, std::chrono::milliseconds timeout) {
-    int outPipe[2];
-    int errPipe[2];
-    if (pipe(outPipe) != 0 || pipe(errPipe) != 0) throw std::runtime_error("pipe failed");
-    const pid_t pid = spawn(program, args, env, outPipe[1], errPipe[1]);
-    close(outPipe[1]);
-    close(errPipe[1]);
+// Collects what the child prints on the pipes given (-1 for none) until both close or the time is
+// up; a child still printing then is killed.
+RunResult collect(pid_t pid, int outFd, int errFd, std::chrono::milliseconds timeout) {
     RunResult result;
     const auto deadline = Clock::now() + timeout;
-    bool outOpen = true;
-    bool errOpen = true;
+    bool outOpen = outFd >= 0;
+    bool errOpen = errFd >= 0;
     while ((outOpen || errOpen) && Clock::now() < deadline) {
-        pollfd fds[2] = {{outOpen ? outPipe[0] : -1, POLLIN, 0},
-                         {errOpen ? errPipe[0] : -1, POLLIN, 0}};
+        pollfd fds[2] = {{outOpen ? outFd : -1, POLLIN, 0}, {errOpen ? errFd : -1, POLLIN, 0}};
         if (poll(fds, 2, 100) <= 0) continue;
-        if (fds[0].revents != 0) outOpen = readSome(outPipe[0], result.out);
-        if (fds[1].revents != 0) errOpen = readSome(errPipe[0], result.err);
+        if (fds[0].revents != 0) outOpen = readSome(outFd, result.out);
+        if (fds[1].revents != 0) errOpen = readSome(errFd, result.err);
     }
-    close(outPipe[0]);
-    close(errPipe[0]);
+    if (outFd >= 0) close(outFd);
+    if (errFd >= 0) close(errFd);
     int raw = 0;
     if (outOpen || errOpen) {
         kill(pid, SIGKILL);
@@ -80,6 +72,31 @@ RunResult runProgram(const std::string& program, const std::vector<std::string>&
     waitpid(pid, &raw, 0);
     result.status = statusOf(raw);
     return result;
+}
+
+}  // namespace
+
+RunResult runProgram(const std::string& program, const std::vector<std::string>& args,
+                     const Env& env, std::chrono::milliseconds timeout) {
+    int outPipe[2];
+    int errPipe[2];
+    if (pipe(outPipe) != 0 || pipe(errPipe) != 0) throw std::runtime_error("pipe failed");
+    const pid_t pid = spawn(program, args, env, outPipe[1], errPipe[1]);
+    close(outPipe[1]);
+    close(errPipe[1]);
+    return collect(pid, outPipe[0], errPipe[0], timeout);
+}
+
+RunResult runProgramWithStdout(const std::string& program, const std::vector<std::string>& args,
+                               const std::string& outFile, std::chrono::milliseconds timeout) {
+    const int outFd = open(outFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0644);
+    if (outFd < 0) throw std::runtime_error("cannot open " + outFile);
+    int errPipe[2];
+    if (pipe(errPipe) != 0) throw std::runtime_error("pipe failed");
+    const pid_t pid = spawn(program, args, {}, outFd, errPipe[1]);
+    close(outFd);
+    close(errPipe[1]);
+    return collect(pid, -1, errPipe[0], timeout);
 }
 
 RunningProgram::RunningProgram(const std::string& program, const std::vector<std::string>& args,

@@ -23,6 +23,11 @@ RunResult runProgram(const std::string& program, const std::vector<std::string>&
                      const Env& env = {},
                      std::chrono::milliseconds timeout = std::chrono::seconds(30));
 
+// The same with stdout written to `outFile` (e.g. /dev/full) instead of collected.
+RunResult runProgramWithStdout(const std::string& program, const std::vector<std::string>& args,
+                               const std::string& outFile,
+                               std::chrono::milliseconds timeout = std::chrono::seconds(30));
+
 // A program left running; its stderr can be read while it runs. Killed at destruction.
 class RunningProgram {
   public:

@@ -3,6 +3,7 @@
 #include <sstream>
 
 #include "core/pulsed_module.h"
+#include "instruments/instrument_error.h"
 #include "lib/cli_actions.h"
 #include "lib/console_interaction.h"
 #include "sim/sim_bench.h"
@@ -119,6 +120,16 @@ TEST_F(CliActions, StepHelpAndShow) {
 
     ASSERT_EQ(run({"show"}), 0);
     EXPECT_EQ(out_.str().rfind("{\n \"f_PulsedZentra\": ", 0), 0u) << "the JSON only";
+}
+
+TEST_F(CliActions, AFailureIsOneLineWhateverTheAnalyzerSaid) {
+    start("kt622");
+    const Action failing{"boom", [](ActionContext&) -> std::string {
+                             throw InstrumentError(-200, "-200 Execution\r\nerror\n");
+                         }};
+    ActionContext ctx{*form_, ui_, out_};
+    EXPECT_EQ(runActions({failing}, ctx, err_), 1);
+    EXPECT_EQ(err_.str(), "zentra-pulse-cli: boom: analyzer error: -200 Execution error\n");
 }
 
 TEST_F(CliActions, ParseErrorsNameTheWordAndWhatWasExpected) {

@@ -5,11 +5,16 @@
 #include <QCursor>
 #include <QDir>
 #include <QFile>
+#include <QLabel>
+#include <QMessageBox>
 #include <QTemporaryDir>
 #include <QTextBrowser>
+#include <QTimer>
+#include <csignal>
 
 #include "ui/help_viewer.h"
 #include "ui/single_instance.h"
+#include "ui/stop_signals.h"
 #include "ui_test_support.h"
 
 namespace zp::ui::testing {
@@ -44,6 +49,47 @@ TEST(QtInteraction, BusyPointerNeverStacksAndAlwaysComesBack) {
         other.setPointer(Pointer::Busy);
     }
     EXPECT_EQ(QApplication::overrideCursor(), nullptr);
+}
+
+// What a message box showed, read while it is up; then `press` closes it.
+struct ShownBox {
+    bool seen = false;
+    Qt::TextFormat format = Qt::AutoText;
+    QString text;
+};
+
+std::unique_ptr<QTimer> answerNextBox(ShownBox& shown, QMessageBox::StandardButton press) {
+    auto timer = std::make_unique<QTimer>();
+    QObject::connect(timer.get(), &QTimer::timeout, [&shown, press] {
+        for (QWidget* w : QApplication::topLevelWidgets()) {
+            auto* box = qobject_cast<QMessageBox*>(w);
+            if (box == nullptr || !box->isVisible()) continue;
+            const auto* label = box->findChild<QLabel*>(QStringLiteral("qt_msgbox_label"));
+            shown = {true, label ? label->textFormat() : Qt::AutoText, label ? label->text() : ""};
+            box->done(press);
+        }
+    });
+    timer->start(10);
+    return timer;
+}
+
+TEST(QtInteraction, BoxesShowInstrumentTextAsPlainTextNeverAsMarkup) {
+    application();
+    QtInteraction ui({});
+    const std::string reply = "<img src=\"file:///etc/hosts\"><b>-113</b> Undefined header";
+    for (const bool question : {false, true}) {
+        SCOPED_TRACE(question ? "ask" : "message");
+        ShownBox shown;
+        const auto answering = answerNextBox(shown, QMessageBox::Yes);
+        if (question) {
+            EXPECT_TRUE(ui.ask(reply));
+        } else {
+            ui.message(reply);
+        }
+        ASSERT_TRUE(shown.seen);
+        EXPECT_EQ(shown.format, Qt::PlainText);
+        EXPECT_EQ(shown.text.toStdString(), reply);
+    }
 }
 
 class HelpFiles : public ::testing::Test {
@@ -110,6 +156,27 @@ TEST(SingleInstance, KeyIsNamedAfterTheUserUnlessOverridden) {
     qputenv("ZP_INSTANCE_KEY", "custom-key");
     EXPECT_EQ(SingleInstance::defaultKey(), "custom-key");
     qunsetenv("ZP_INSTANCE_KEY");
+}
+
+TEST(StopSignals, SigtermAndSigintEndTheEventLoopInsteadOfTheProcess) {
+    application();
+    struct sigaction before {};
+    sigaction(SIGTERM, nullptr, &before);
+    for (const int signal : {SIGTERM, SIGINT}) {
+        const StopSignals stop;
+        EXPECT_THROW(StopSignals(), std::logic_error);
+        EXPECT_EQ(stop.received(), 0);
+        std::raise(signal);
+        // Give up with 7 when the stop never reaches the loop.
+        QTimer giveUp;
+        giveUp.callOnTimeout([] { QCoreApplication::exit(7); });
+        giveUp.start(5000);
+        EXPECT_EQ(QCoreApplication::exec(), 0);
+        EXPECT_EQ(stop.received(), signal);
+    }
+    struct sigaction after {};
+    sigaction(SIGTERM, nullptr, &after);
+    EXPECT_EQ(after.sa_handler, before.sa_handler) << "the previous handler must come back";
 }
 
 }  // namespace
