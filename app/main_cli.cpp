@@ -7,9 +7,9 @@
 
 #include "forms/main_form.h"
 #include "instruments/instrument_error.h"
-#include "lib/bench_options.h"
-#include "lib/cli_actions.h"
-#include "lib/console_interaction.h"
+#include "common/bench_options.h"
+#include "common/cli_actions.h"
+#include "common/console_interaction.h"
 
 int main(int argc, char** argv) {
     using namespace zp::app;

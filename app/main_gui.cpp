@@ -12,7 +12,7 @@
 
 #include "forms/main_form.h"
 #include "instruments/instrument_error.h"
-#include "lib/bench_options.h"
+#include "common/bench_options.h"
 #include "ui/main_window.h"
 #include "ui/qt_interaction.h"
 #include "ui/single_instance.h"

@@ -3,7 +3,7 @@
 #include <optional>
 #include <sstream>
 
-#include "lib/bench_options.h"
+#include "common/bench_options.h"
 
 namespace zp::app {
 namespace {

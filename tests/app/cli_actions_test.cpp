@@ -4,8 +4,8 @@
 
 #include "core/pulsed_module.h"
 #include "instruments/instrument_error.h"
-#include "lib/cli_actions.h"
-#include "lib/console_interaction.h"
+#include "common/cli_actions.h"
+#include "common/console_interaction.h"
 #include "sim/sim_bench.h"
 
 namespace zp::app {

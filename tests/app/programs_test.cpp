@@ -10,7 +10,7 @@
 #include <filesystem>
 
 #include "child_process.h"
-#include "lib/bench_options.h"
+#include "common/bench_options.h"
 
 namespace zp::testing {
 namespace {
