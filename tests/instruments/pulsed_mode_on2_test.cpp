@@ -190,6 +190,13 @@ TEST(PulsedModeOn2, EachModelGetsItsOwnRoutingAttenuatorsAndEnables) {
          {"NBFATNA=30", "NBFATNB=15", "NBFATNR1=30", "NBFATNR2=30"},
          {"Src1Out1PulseModEnable=Enable"},  // this analyzer has no Src2Out1PulseModEnable
          2},
+        {"no pulse generators: no routing, the rest as usual",
+         "kt622",
+         [](ApplySnapshot& s) { s.mode.noPG = true; },
+         {},
+         {"NBFATNA=100", "NBFATNB=100", "NBFATNR1=100", "NBFATNR2=100"},
+         {"Src1Out1PulseModEnable=Enable"},
+         2},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.name);
