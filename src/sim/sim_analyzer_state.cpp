@@ -145,7 +145,9 @@ void SimAnalyzerState::copyChannel(int from, int to) {
 }
 
 std::vector<std::string> SimAnalyzerState::alcModes(int port) const {
-    if (port < 1 || port > model_.ports) throw analyzerError(kDataOutOfRange);
+    // A two-port analyzer's second source comes out as port 3.
+    const int lastPort = model_.ports == 2 && model_.sources >= 2 ? 3 : model_.ports;
+    if (port < 1 || port > lastPort) throw analyzerError(kDataOutOfRange);
     return {"INTernal", "EXTernal", "OPENloop"};
 }
 

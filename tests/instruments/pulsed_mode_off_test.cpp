@@ -1,0 +1,176 @@
+// Pulsed mode off on both paths, read from the I/O trace.
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <string>
+
+#include "instruments/apply_support.h"
+#include "instruments/probe_bench.h"
+
+namespace zp {
+namespace {
+
+using namespace testing_support;
+
+Lines outputOff(const std::string& a, const std::string& n) {
+    return {"BUS " + a + " open",
+            "BUS " + a + " W \"*IDN?\\n\"",
+            "BUS " + a + " R \"Veltrix,PG8102A,SIM" + a + ",1.0\\n\"",
+            "BUS " + a + " clear",
+            "BUS " + a + " W \":OUTP" + n + ":STAT OFF\\n\"",
+            "BUS " + a + " W \":SYST:ERR?\\n\"",
+            "BUS " + a + " R \"+0,\\\"No error\\\"\\n\""};
+}
+
+const Lines kMessageCleared = {"ANA Application.messageArea()", "ANA MessageArea.setText(\"\")"};
+const Lines kIfOff = {"ANA Channel[1].ifConfiguration()",
+                      "ANA IFConfiguration[1].setIfSwitchA(false)",
+                      "ANA IFConfiguration[1].setIfSwitchB(false)",
+                      "ANA IFConfiguration[1].setReceiverSwitch(\"ALL\", false)",
+                      "ANA IFConfiguration[1].setInternalGateSwitch(false)"};
+
+TEST(PulsedModeOff, OnlyTheUsedOutputsGoOffThenTheIfGating) {
+    ApplySnapshot s = snapshotFor("zx20-j55");  // internal gates: their switch goes off too
+    changeRow(s, 3, [](PGRow& r) { r.enabled = kUnchecked; });
+    ProbeBench bench("zx20-j55");
+    const ApplyResult result = SPulsedModeOff(bench, s);
+    EXPECT_FALSE(result.failure);
+    EXPECT_EQ(result.generatorRows, 4);
+    EXPECT_EQ(bench.timeline(), join({kOpening,
+                                      kMessageCleared,
+                                      {"ANA Application.setBusSwitch(true)"},
+                                      outputOff("11", "1"),
+                                      outputOff("11", "2"),
+                                      outputOff("12", "1"),
+                                      outputOff("13", "1"),
+                                      kIfOff,
+                                      {"ANA Channel[1].setFrequencyOffsetFrequency(0)"},
+                                      kBusEnd}));
+}
+
+TEST(PulsedModeOff, NoPGStillMakesAndReleasesTheBus) {
+    ApplySnapshot s = snapshotFor("zx20-j55");
+    s.mode.noPG = true;
+    s.mode.converterMeas = true;
+    ProbeBench bench("zx20-j55");
+    EXPECT_FALSE(SPulsedModeOff(bench, s).failure);
+    EXPECT_EQ(
+        bench.timeline(),
+        join({kOpening, kMessageCleared, {"ANA Application.setBusSwitch(true)"}, kIfOff, kBusEnd}));
+}
+
+TEST(PulsedModeOff, AGeneratorErrorLeavesLaterRowsOnAndTheIfGating) {
+    ApplySnapshot s = snapshotFor("kt622");
+    ProbeBench bench;
+    bench.sim().faults().generatorErrors[12] = "-222,\"Data out of range\"";
+    const ApplyResult result = SPulsedModeOff(bench, s);
+    ASSERT_TRUE(result.failure);
+    EXPECT_EQ(result.failure->description,
+              "Pulse Generator at address 12 generated the following error: -222,\"Data out of "
+              "range\"\n");
+    EXPECT_EQ(result.generatorRows, 2);
+    EXPECT_EQ(linesWith(bench.timeline(), {"BUS 13", "IFConfiguration", "FrequencyOffset"}),
+              Lines{});
+}
+
+const Lines kHardwareObjects = {
+    "ANA Channel[1].pulseGenerator()", "ANA Channel[1].pathConfiguration()",
+    "ANA Channel[1].ifConfiguration()", "ANA Channel[1].signalProcessingModule()"};
+
+Lines element(const std::string& name, const std::string& value) {
+    return {"ANA PathConfiguration[1].element(\"" + name + "\")",
+            "ANA PathElement[1:" + name + "].setValue(\"" + value + "\")"};
+}
+
+TEST(PulsedModeOff2, EveryRowsGeneratorGoesOffAndTheHardwareBackToNormal) {
+    ApplySnapshot s = snapshotFor("kt622");
+    changeRow(s, 2, [](PGRow& r) { r.enabled = kUnchecked; });  // still switched off
+    changeRow(s, 3, [](PGRow& r) { r.intPGOutput = 3; });
+    s.state.HasModSource2 = kTrue;  // one source: no port 3 call all the same
+    ProbeBench bench;
+    EXPECT_FALSE(SPulsedModeOff2(bench, s).failure);
+    const auto off = [](const std::string& g) {
+        return Lines{"ANA PulseGenerator[1].setState(" + g + ", false)"};
+    };
+    EXPECT_EQ(bench.timeline(), join({kOpening,
+                                      kHardwareObjects,
+                                      off("1"),
+                                      element("PulseModDrive", "ON"),
+                                      off("2"),
+                                      element("IFGateA", "ON"),
+                                      off("2"),
+                                      element("IFGateB", "ON"),
+                                      off("3"),
+                                      element("IFGateR1", "ON"),
+                                      off("2"),
+                                      element("IFGateR2", "ON"),
+                                      element("IFAntiAliasFilter", "AUTO"),
+                                      element("IFSigPathAll", "WBF"),
+                                      {"ANA IFConfiguration[1].setNarrowbandSwitch(0)",
+                                       "ANA SignalProcessingModuleFour[1].setProcessingSwitch(0)",
+                                       "ANA PulseGenerator[1].setState(0, false)"},
+                                      kMessageCleared,
+                                      element("NBFATNA", "3"),
+                                      element("NBFATNB", "3"),
+                                      element("NBFATNR1", "3"),
+                                      element("NBFATNR2", "3"),
+                                      {"ANA Channel[1].setALCLevelingMode(1, 0)"},
+                                      element("Src1Out1PulseModEnable", "Disable"),
+                                      kEnd}));
+}
+
+TEST(PulsedModeOff2, GatesAndLevelingByModel) {
+    struct Case {
+        const char* name;
+        const char* model;
+        bool noPG;
+        Lines gates;     // the IFGate and PulseModDrive values set
+        Lines leveling;  // leveling modes and modulator enables
+    };
+    const Lines twoSources = {"setALCLevelingMode(1, 0)", "Src1Out1PulseModEnable=Disable",
+                              "setALCLevelingMode(3, 0)", "Src2Out1PulseModEnable=Disable"};
+    const Case cases[] = {
+        {"two-port, two sources",
+         "kt633",
+         false,
+         {"PulseModDrive=ON", "IFGateA=ON", "IFGateB=ON", "IFGateR1=ON", "IFGateR2=ON"},
+         twoSources},
+        {"four-port, three sources",
+         "kt655",
+         false,
+         {"PulseModDrive=ON", "IFGateA=ON", "IFGateB=ON", "IFGateC=ON", "IFGateD=ON", "IFGateR1=ON",
+          "IFGateR2=ON", "IFGateR3=ON", "IFGateR4=ON"},
+         twoSources},
+        {"four-port without modulators",
+         "kt644",
+         false,
+         {"IFGateA=ON", "IFGateB=ON", "IFGateC=ON", "IFGateD=ON", "IFGateR1=ON", "IFGateR2=ON",
+          "IFGateR3=ON", "IFGateR4=ON"},
+         {}},
+        {"no pulse generators", "kt633", true, {}, twoSources},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.name);
+        ApplySnapshot s = snapshotFor(c.model);
+        s.mode.noPG = c.noPG;
+        sim::SimBench bench(c.model);
+        EXPECT_FALSE(SPulsedModeOff2(bench, s).failure);
+        const Lines lines = bench.trace()->lines();
+        const Lines settings = elementSettings(lines);
+        Lines leveling;
+        for (const std::string& l : lines) {
+            if (l.find("setALCLevelingMode") != std::string::npos) {
+                leveling.push_back(l.substr(l.find("].") + 2));
+            } else if (l.find("PathElement[1:Src") != std::string::npos) {
+                leveling.push_back(settingsOf(elementSettings({l}), {"Src"}).at(0));
+            }
+        }
+        EXPECT_EQ(settingsOf(settings, {"IFGate", "PulseModDrive"}), c.gates);
+        EXPECT_EQ(leveling, c.leveling);
+        EXPECT_EQ(linesWith(lines, {"setState(1,", "setState(2,"}).empty(), c.noPG);
+    }
+}
+
+}  // namespace
+}  // namespace zp
