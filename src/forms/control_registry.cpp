@@ -8,14 +8,6 @@ namespace zp {
 
 namespace {
 
-void designed(Control& c, ControlDesign d) {
-    c.name = std::move(d.name);
-    c.caption = std::move(d.caption);
-    c.geometry = d.geometry;
-    c.enabled = true;
-    c.visible = true;
-}
-
 ControlRegistry::RowHandler ignoringRow(ControlRegistry::Handler h) {
     if (!h) return {};
     return [h = std::move(h)](int) { h(); };
@@ -54,25 +46,30 @@ ControlRegistry::Item& ControlRegistry::add(Item item) {
     return items_.back();
 }
 
+ControlRegistry::Item& ControlRegistry::declare(ControlKind kind, Control& c, ControlDesign d,
+                                                std::string container, Handler handler) {
+    c.name = std::move(d.name);
+    c.caption = std::move(d.caption);
+    c.geometry = d.geometry;
+    c.enabled = true;
+    c.visible = true;
+    return add({.kind = kind,
+                .name = c.name,
+                .container = std::move(container),
+                .control = &c,
+                .handler = ignoringRow(std::move(handler))});
+}
+
 void ControlRegistry::window(Control& c, ControlDesign d) {
-    designed(c, std::move(d));
-    add({.kind = ControlKind::Window, .name = c.name, .control = &c});
+    declare(ControlKind::Window, c, std::move(d), {}, {});
 }
 
 void ControlRegistry::frame(Control& c, ControlDesign d, std::string container) {
-    designed(c, std::move(d));
-    add({.kind = ControlKind::Frame,
-         .name = c.name,
-         .container = std::move(container),
-         .control = &c});
+    declare(ControlKind::Frame, c, std::move(d), std::move(container), {});
 }
 
 void ControlRegistry::label(Control& c, ControlDesign d, std::string container) {
-    designed(c, std::move(d));
-    add({.kind = ControlKind::Label,
-         .name = c.name,
-         .container = std::move(container),
-         .control = &c});
+    declare(ControlKind::Label, c, std::move(d), std::move(container), {});
 }
 
 void ControlRegistry::entry(EntryField& f, EntryField design, Geometry g, std::string container,
@@ -88,42 +85,26 @@ void ControlRegistry::entry(EntryField& f, EntryField design, Geometry g, std::s
 
 void ControlRegistry::checkBox(CheckBox& c, ControlDesign d, Check16 value, std::string container,
                                Handler onClick) {
-    designed(c, std::move(d));
+    declare(ControlKind::CheckBox, c, std::move(d), std::move(container), std::move(onClick));
     c.value = value;
-    add({.kind = ControlKind::CheckBox,
-         .name = c.name,
-         .container = std::move(container),
-         .control = &c,
-         .handler = ignoringRow(std::move(onClick))});
 }
 
 void ControlRegistry::button(Control& c, ControlDesign d, std::string container, Handler onClick) {
-    designed(c, std::move(d));
-    add({.kind = ControlKind::Button,
-         .name = c.name,
-         .container = std::move(container),
-         .control = &c,
-         .handler = ignoringRow(std::move(onClick))});
+    declare(ControlKind::Button, c, std::move(d), std::move(container), std::move(onClick));
 }
 
 void ControlRegistry::menu(MenuEntry& m, ControlDesign d) {
-    designed(m, std::move(d));
     m.checked = false;
     // Opening a menu changes nothing.
-    add({.kind = ControlKind::Menu, .name = m.name, .control = &m, .handler = [](int) {}});
+    declare(ControlKind::Menu, m, std::move(d), {}, [] {});
 }
 
 void ControlRegistry::menuEntry(MenuEntry& m, ControlDesign d, std::string menu, Handler onClick,
                                 MenuStyle style) {
-    designed(m, std::move(d));
     m.checked = false;
-    add({.kind = ControlKind::Menu,
-         .name = m.name,
-         .container = std::move(menu),
-         .control = &m,
-         .handler = ignoringRow(std::move(onClick)),
-         .checkable = style.checkable,
-         .separatorBefore = style.separatorBefore});
+    Item& item = declare(ControlKind::Menu, m, std::move(d), std::move(menu), std::move(onClick));
+    item.checkable = style.checkable;
+    item.separatorBefore = style.separatorBefore;
 }
 
 void ControlRegistry::labelRows(std::string name, std::deque<Control>& rows,

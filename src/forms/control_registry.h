@@ -130,6 +130,9 @@ class ControlRegistry {
     Ref find(const std::string& name) const;
     const Item* findItem(std::string_view base) const;
     Item& add(Item item);
+    // Puts a control into its designed state and adds its line.
+    Item& declare(ControlKind kind, Control& c, ControlDesign d, std::string container,
+                  Handler handler);
     RowHandler handlerOf(const Item& item) const;
     std::string describe(const Ref& ref) const;
     void connect(const Item& item);
