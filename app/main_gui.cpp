@@ -10,9 +10,9 @@
 #include <string>
 #include <vector>
 
+#include "common/bench_options.h"
 #include "forms/main_form.h"
 #include "instruments/instrument_error.h"
-#include "common/bench_options.h"
 #include "ui/main_window.h"
 #include "ui/qt_interaction.h"
 #include "ui/single_instance.h"
