@@ -148,7 +148,8 @@ class ControlRegistry {
     std::vector<std::function<void()>> listeners_;
 };
 
-// Declares nothing itself: the base of every window model, holding its table and its person.
+// The base of every window model: its table of controls and the person at the screen. A model
+// declares its controls into the table; views and the command line take it from there.
 class FormModel {
   public:
     explicit FormModel(Interaction& ui) : ui_(ui), controls_(ui) {}
