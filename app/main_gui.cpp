@@ -1,5 +1,5 @@
-// zentra-pulse: the Qt front end. One instance per user; a second start brings the first to the
-// front and ends.
+// zentra-pulse: the Qt front end. One instance per user and display; a second start brings the
+// first to the front and ends.
 
 #include <QApplication>
 #include <QDir>
@@ -10,9 +10,9 @@
 #include <string>
 #include <vector>
 
+#include "common/bench_options.h"
 #include "forms/main_form.h"
 #include "instruments/instrument_error.h"
-#include "common/bench_options.h"
 #include "ui/main_window.h"
 #include "ui/qt_interaction.h"
 #include "ui/single_instance.h"
@@ -48,6 +48,7 @@ int main(int argc, char** argv) {
     // A second start hands over before anything else runs. A screenshot run stands alone.
     zp::ui::SingleInstance instance(zp::ui::SingleInstance::defaultKey());
     if (!options.screenshot && instance.start() == zp::ui::SingleInstance::Role::Secondary) {
+        std::cerr << "zentra-pulse: already running on this display; brought it to the front\n";
         return 0;
     }
 
@@ -61,10 +62,12 @@ int main(int argc, char** argv) {
     try {
         form.Form_Load();
     } catch (const zp::InstrumentError& e) {
-        ui.message("The analyzer cannot be reached: " + e.description() + "\nThe program ends.");
+        ui.message("The analyzer cannot be reached: " + e.description() + "\nThe program ends.",
+                   zp::MessageKind::Warning);
         return 1;
     } catch (const std::exception& e) {
-        ui.message(std::string("The program could not start: ") + e.what());
+        ui.message(std::string("The program could not start: ") + e.what(),
+                   zp::MessageKind::Warning);
         return 1;
     }
 

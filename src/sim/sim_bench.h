@@ -45,6 +45,7 @@ class SimBench : public Bench {
     std::unique_ptr<InstrumentBus> createBus() override;
     IoTrace* trace() override { return &trace_; }
     std::string describe() const override;
+    bool simulated() const override { return true; }
 
     void setBusFactory(std::function<std::unique_ptr<InstrumentBus>()> factory,
                        std::string description);

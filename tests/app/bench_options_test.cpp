@@ -126,5 +126,26 @@ TEST(BenchOptions, EarlyExitsAnswerHelpVersionModelsAndUsageErrors) {
     EXPECT_EQ(usageText(Program::Gui).find("calculate"), std::string::npos);
 }
 
+TEST(BenchOptions, HelpListsEveryOptionOfItsProgram) {
+    const std::pair<const char*, std::vector<std::string>> options[] = {
+        {"--analyzer", {"--analyzer", "sim:kt622"}},
+        {"--list-models", {"--list-models"}},
+        {"--bus", {"--bus", "sim"}},
+        {"--trace-io", {"--trace-io", "t.log"}},
+        {"--fault", {"--fault", "baddata"}},
+        {"--help", {"--help"}},
+        {"--version", {"--version"}},
+        {"--yes", {"--yes"}},
+        {"--screenshot", {"--screenshot", "w.png"}}};
+    for (const Program program : {Program::Gui, Program::Cli}) {
+        const std::string usage = usageText(program);
+        for (const auto& [option, args] : options) {
+            const bool accepted = parseCommandLine(args, program).error.empty();
+            EXPECT_EQ(usage.find(std::string("  ") + option) != std::string::npos, accepted)
+                << programName(program) << " " << option;
+        }
+    }
+}
+
 }  // namespace
 }  // namespace zp::app
