@@ -92,7 +92,8 @@ void MainForm::declareControls() {
     t.frame(frm_pulsed, {"frm_pulsed", "", kPulsedFrame});
     t.button(b_calculate, {"b_calculate", "Calculate", kCalculateButton}, "frm_pulsed",
              [this] { b_calculate_Click(); });
-    t.button(b_apply, {"b_apply", "Apply", kApplyButton}, "frm_pulsed", notYet);
+    t.button(b_apply, {"b_apply", "Apply", kApplyButton}, "frm_pulsed",
+             [this] { b_Apply_Click(); });
     t.checkBox(chk_pulsed, {"chk_pulsed", "Pulsed Mode On", kPulsedBox}, kChecked, "frm_pulsed",
                [this] { chk_pulsed_Click(); });
 

@@ -8,6 +8,7 @@
 #include <deque>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -17,6 +18,7 @@
 #include "forms/control_registry.h"
 #include "forms/controls.h"
 #include "forms/interaction.h"
+#include "instruments/apply/apply_types.h"
 #include "instruments/bench.h"
 
 namespace zp {
@@ -76,6 +78,16 @@ class MainForm : public FormModel {
     void m_contents_Click();
     void Invalidate();
 
+    // ---- Apply: the setup onto the instruments, or off them, by the procedure "Pulsed Mode On"
+    // and UseInternalPG choose. Public because the profile window runs it too: it asks nothing,
+    // a failure is one warning message, and it does not look at NeedsCalculation. Like every
+    // handler it leaves telling the views to its caller (the table does after a click).
+    void b_Apply_Click();
+    // What Apply hands its procedure: the state, the fields as they stand, the menu marks.
+    ApplySnapshot applySnapshot() const;
+    // What the last Apply did, for the front ends to report; nothing before the first.
+    const std::optional<ApplyResult>& lastApply() const { return lastApply_; }
+
     AnalyzerStatus status() const;
 
     // ---- Timing rules.
@@ -130,6 +142,7 @@ class MainForm : public FormModel {
     Bench& bench_;
     SolverFactory solverFactory_;
     AnalyzerIdentity identity_;
+    std::optional<ApplyResult> lastApply_;
 };
 
 }  // namespace zp

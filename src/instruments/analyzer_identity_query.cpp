@@ -8,11 +8,13 @@
 namespace zp {
 
 AnalyzerIdentity readAnalyzerIdentity(AnalyzerApplication& app) {
+    // The capability object comes before the model and option texts, as the start-up trace
+    // shows them.
+    std::unique_ptr<AnalyzerCaps> caps = app.hardwareInfo();
+    if (!caps) throw InstrumentError(kOwnCheckError, "The analyzer reports no capability object.");
     AnalyzerIdentity id;
     id.modelText = app.modelText();
     id.optionText = app.optionText();
-    std::unique_ptr<AnalyzerCaps> caps = app.hardwareInfo();
-    if (!caps) throw InstrumentError(kOwnCheckError, "The analyzer reports no capability object.");
     if (isListedModelText(id.modelText)) {
         // Sources are asked first: the order is part of the start-up trace.
         id.sourceCount = caps->sourceCount();

@@ -8,7 +8,7 @@
 namespace zp {
 
 // Reads the identity on an open connection. The calls, in this order, are what the I/O trace of
-// start-up shows: modelText, optionText, hardwareInfo, then for listed models sourceCount,
+// start-up shows: hardwareInfo, modelText, optionText, then for listed models sourceCount,
 // portCount and hardwareValue. Throws InstrumentError.
 AnalyzerIdentity readAnalyzerIdentity(AnalyzerApplication& app);
 

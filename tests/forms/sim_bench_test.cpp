@@ -38,17 +38,17 @@ TEST(OnSimBench, DefaultSolverKeepsOrMovesThePrf) {
 // Start-up and help write exactly these analyzer calls; scripts compare them.
 TEST(OnSimBench, StartupAndHelpTraces) {
     const std::vector<std::string> listedStartup = {
+        "ANA Application.hardwareInfo()",
         "ANA Application.modelText() -> \"KT655A\"",
         "ANA Application.optionText() -> \"K71 M83 M84\"",
-        "ANA Application.hardwareInfo()",
         "ANA Caps.sourceCount() -> 3",
         "ANA Caps.portCount() -> 4",
         "ANA Caps.hardwareValue() -> \"5.0\"",
     };
     const std::vector<std::string> unlistedStartup = {
+        "ANA Application.hardwareInfo()",
         "ANA Application.modelText() -> \"ZX20\"",
         "ANA Application.optionText() -> \"J55\"",
-        "ANA Application.hardwareInfo()",
     };
     for (const auto& [model, startup] :
          {std::pair{"kt655", listedStartup}, std::pair{"zx20-j55", unlistedStartup}}) {

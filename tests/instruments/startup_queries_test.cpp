@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <vector>
 
 #include "instruments/analyzer_identity_query.h"
 #include "instruments/error_capture.h"
@@ -40,6 +41,17 @@ TEST(ReadAnalyzerIdentity, AnalyzerErrorsAreThrown) {
     faults.add("analyzer:Caps.portCount=-200 Execution error");
     sim::SimBench bench("kt622", faults);
     EXPECT_EQ(errorOf([&] { readAnalyzerIdentity(bench); }), "-200 Execution error");
+}
+
+// The capability object is obtained before the model text is read: an analyzer that cannot
+// give it is never asked for its model.
+TEST(ReadAnalyzerIdentity, CapabilityObjectComesFirst) {
+    sim::SimFaults faults;
+    faults.add("analyzer:Application.hardwareInfo=-200 Execution error");
+    sim::SimBench bench("kt622", faults);
+    EXPECT_EQ(errorOf([&] { readAnalyzerIdentity(bench); }), "-200 Execution error");
+    EXPECT_EQ(bench.trace()->lines(),
+              std::vector<std::string>{"ANA Application.hardwareInfo() !! -200 Execution error"});
 }
 
 TEST(QueryHelpFile, FileWithoutQuotesOrTheAnalyzersError) {
