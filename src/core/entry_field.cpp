@@ -8,27 +8,11 @@
 
 #include "core/decimal_digits.h"
 #include "core/numeric.h"
+#include "core/text.h"
 
 namespace zp {
 
 namespace {
-
-constexpr std::string_view kBlanks = " \t\r\n";
-
-std::string_view trim(std::string_view s) {
-    const auto first = s.find_first_not_of(kBlanks);
-    if (first == std::string_view::npos) return {};
-    return s.substr(first, s.find_last_not_of(kBlanks) - first + 1);
-}
-
-char lower(char c) {
-    return (c >= 'A' && c <= 'Z') ? static_cast<char>(c - 'A' + 'a') : c;
-}
-
-bool equalsIgnoreCase(std::string_view a, std::string_view b) {
-    return a.size() == b.size() && std::equal(a.begin(), a.end(), b.begin(),
-                                              [](char x, char y) { return lower(x) == lower(y); });
-}
 
 // Both micro signs become 'u' so that "µs" and "μsec" read as "us".
 std::string asciiMicro(std::string_view s) {
@@ -244,9 +228,9 @@ EntryField::Parsed EntryField::parse(std::string_view text) const {
         if (u.name == rest || shortForm(u.name) == rest) return accept(u.multiplier);
     }
     for (const auto& u : units_) {
-        if (u.name.size() > 1 && equalsIgnoreCase(u.name, rest)) return accept(u.multiplier);
+        if (u.name.size() > 1 && equalsIgnoringCase(u.name, rest)) return accept(u.multiplier);
         const auto s = shortForm(u.name);
-        if (s && s->size() > 1 && equalsIgnoreCase(*s, rest)) return accept(u.multiplier);
+        if (s && s->size() > 1 && equalsIgnoringCase(*s, rest)) return accept(u.multiplier);
     }
     // A multiplier letter, optionally followed by the base unit: "10k", "10 kohm", "2.5us".
     if (const auto m = siMultiplier(rest[0])) {
@@ -255,7 +239,7 @@ EntryField::Parsed EntryField::parse(std::string_view text) const {
         for (const auto& u : units_) {
             if (u.multiplier != 1.0 || u.name == ".") continue;
             const auto s = shortForm(u.name);
-            if (equalsIgnoreCase(u.name, tail) || (s && equalsIgnoreCase(*s, tail))) ok = true;
+            if (equalsIgnoringCase(u.name, tail) || (s && equalsIgnoringCase(*s, tail))) ok = true;
         }
         if (ok) return accept(*m);
     }

@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <utility>
 
+#include "core/timing_limits.h"
 #include "forms/main_form_layout.h"
 #include "instruments/analyzer_identity_query.h"
 #include "instruments/help_file_query.h"
@@ -60,9 +61,11 @@ void MainForm::buildControls() {
     lbl_prf = makeControl("lbl_prf", "Pulse Repetition Frequency :", kPrfLabel);
     lbl_pri = makeControl("lbl_pri", "Pulse Repetition Interval :", kPriLabel);
     lbl_ifbw = makeControl("lbl_ifbw", "Receiver IF Bandwidth :", kIfbwLabel);
-    VexoEdit_prf = EntryField("VexoEdit_prf", 5000.0, 0.001, 165000000.0, 3, units::kHertz);
+    VexoEdit_prf =
+        EntryField("VexoEdit_prf", 5000.0, kPrfRangeHz.low, kPrfRangeHz.high, 3, units::kHertz);
     VexoEdit_pri = EntryField("VexoEdit_pri", 0.0002, 3.4e-9, 1e18, 3, units::kSeconds);
-    VexoEdit_IFBW = EntryField("VexoEdit_IFBW", 500.0, 1.0, 10000.0, 0, units::kHertz);
+    VexoEdit_IFBW =
+        EntryField("VexoEdit_IFBW", 500.0, kIfbwRangeHz.low, kIfbwRangeHz.high, 0, units::kHertz);
     chk_FixedPRF = makeCheckBox("chk_FixedPRF", "Fixed PRF", kFixedPrfBox, kChecked);
 
     frm_gates = makeControl("frm_gates", "Modulation/Gates", kGatesFrame);

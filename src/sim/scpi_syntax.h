@@ -7,6 +7,8 @@
 #include <string_view>
 #include <vector>
 
+#include "core/text.h"
+
 namespace zp::sim {
 
 struct ScpiErrorCode {
@@ -59,8 +61,5 @@ double parseNumber(std::string_view text, ScpiUnit unit);
 
 // ON/OFF/1/0. Throws ScpiFailure (illegal parameter value) for anything else.
 bool parseBoolean(std::string_view text);
-
-std::string trim(std::string_view text);
-std::string upper(std::string_view text);
 
 }  // namespace zp::sim

@@ -1,10 +1,10 @@
 #include "sim/sim_analyzer_state.h"
 
 #include <algorithm>
-#include <cctype>
 #include <cmath>
 #include <filesystem>
 
+#include "core/pulsed_module.h"
 #include "sim/sim_errors.h"
 
 namespace zp::sim {
@@ -15,15 +15,6 @@ constexpr int kMaxChannel = 200;
 constexpr int kMaxPoints = 32001;
 
 bool contains(const std::string& text, std::string_view part) {
-    return text.find(part) != std::string::npos;
-}
-
-bool containsIgnoringCase(std::string text, std::string part) {
-    const auto upper = [](std::string& s) {
-        for (auto& c : s) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    };
-    upper(text);
-    upper(part);
     return text.find(part) != std::string::npos;
 }
 
@@ -44,10 +35,7 @@ SimAnalyzerState::SimAnalyzerState(SimModel model, SimFaults* faults, IoTrace* t
 }
 
 bool SimAnalyzerState::isListedModel() const {
-    for (const char* code : {"KT611", "KT622", "KT633", "KT644", "KT655"}) {
-        if (containsIgnoringCase(model_.modelText, code)) return true;
-    }
-    return false;
+    return isListedModelText(model_.modelText);
 }
 
 bool SimAnalyzerState::hasSourceModulator(int source) const {

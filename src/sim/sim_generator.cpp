@@ -67,7 +67,7 @@ std::string shortForm(std::string_view mnemonic) {
 // INT2), or fails with -224.
 std::string enumeration(const std::string& param,
                         std::initializer_list<std::string_view> keywords) {
-    const std::string word = trim(param);
+    const std::string word(trim(param));
     const auto digitsOf = [](std::string_view text) {
         std::size_t i = text.size();
         while (i > 0 && std::isdigit(static_cast<unsigned char>(text[i - 1])) != 0) --i;
@@ -275,13 +275,13 @@ bool matchPattern(std::span<const char* const> pattern, std::span<const HeaderNo
 
 std::vector<std::string> splitParameters(std::string_view text) {
     std::vector<std::string> params;
-    const std::string all = trim(text);
+    const std::string all(trim(text));
     if (all.empty()) return params;
     std::size_t pos = 0;
     while (true) {
         const std::size_t comma = all.find(',', pos);
-        std::string param = trim(std::string_view(all).substr(
-            pos, comma == std::string::npos ? std::string::npos : comma - pos));
+        std::string param(trim(std::string_view(all).substr(
+            pos, comma == std::string::npos ? std::string::npos : comma - pos)));
         if (param.empty()) throw ScpiFailure{kSyntaxError};
         params.push_back(std::move(param));
         if (comma == std::string::npos) break;
@@ -336,7 +336,7 @@ void SimGenerator::preset() {
 std::optional<std::string> SimGenerator::handle(std::string_view line) {
     std::vector<std::string> replies;
     for (std::string_view unit : splitMessage(line)) {
-        const std::string text = trim(unit);
+        const std::string text(trim(unit));
         if (text.empty()) continue;
         try {
             std::size_t blank = 0;
