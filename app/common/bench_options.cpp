@@ -4,6 +4,7 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "sim/faults.h"
 #include "transport/transport_factory.h"
 
 namespace zp::app {
@@ -135,30 +136,6 @@ ParsedCommandLine parseCommandLine(const std::vector<std::string>& args, Program
         return fail("unexpected argument '" + result.rest.front() + "'");
     }
     return result;
-}
-
-std::unique_ptr<sim::SimBench> makeBench(const BenchOptions& options) {
-    sim::SimFaults faults;
-    for (const std::string& fault : options.faults) faults.add(fault);
-    auto bench = std::make_unique<sim::SimBench>(options.model, std::move(faults));
-    if (options.traceFile) bench->trace()->openFile(*options.traceFile);
-    if (options.bus) {
-        BusResources resources = parseBusResources(*options.bus);
-        IoTrace* trace = bench->trace();
-        bench->setBusFactory([resources, trace] { return makeTransportBus(resources, trace); },
-                             "generators on " + *options.bus);
-    }
-    return bench;
-}
-
-std::unique_ptr<sim::SimBench> makeBenchOrReport(const BenchOptions& options, Program program,
-                                                 std::ostream& err) {
-    try {
-        return makeBench(options);
-    } catch (const std::exception& e) {
-        err << programName(program) << ": " << e.what() << '\n';
-        return nullptr;
-    }
 }
 
 std::optional<int> earlyExit(const ParsedCommandLine& cmd, Program program, std::ostream& out,

@@ -2,10 +2,10 @@
 
 #include <sstream>
 
-#include "core/pulsed_module.h"
-#include "instruments/instrument_error.h"
 #include "common/cli_actions.h"
 #include "common/console_interaction.h"
+#include "core/pulsed_module.h"
+#include "instruments/instrument_error.h"
 #include "sim/sim_bench.h"
 
 namespace zp::app {

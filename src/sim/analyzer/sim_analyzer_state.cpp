@@ -1,11 +1,11 @@
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
 
 #include <algorithm>
 #include <cmath>
 #include <filesystem>
 
 #include "core/pulsed_module.h"
-#include "sim/sim_errors.h"
+#include "sim/analyzer/sim_errors.h"
 
 namespace zp::sim {
 

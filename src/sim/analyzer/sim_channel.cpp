@@ -1,6 +1,6 @@
 #include <cmath>
 
-#include "sim/sim_handles.h"
+#include "sim/analyzer/sim_handles.h"
 
 namespace zp::sim {
 

@@ -3,9 +3,9 @@
 
 #include <optional>
 
-#include "sim/sim_analyzer_state.h"
-#include "sim/sim_errors.h"
-#include "sim/sim_generator.h"
+#include "sim/analyzer/sim_analyzer_state.h"
+#include "sim/analyzer/sim_errors.h"
+#include "sim/generators/sim_generator.h"
 
 namespace zp::sim {
 

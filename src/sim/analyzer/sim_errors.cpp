@@ -1,4 +1,4 @@
-#include "sim/sim_errors.h"
+#include "sim/analyzer/sim_errors.h"
 
 #include <cstdlib>
 

@@ -7,8 +7,8 @@
 #include <cstdio>
 #include <optional>
 
-#include "sim/sim_analyzer_state.h"
-#include "sim/sim_errors.h"
+#include "sim/analyzer/sim_analyzer_state.h"
+#include "sim/analyzer/sim_errors.h"
 
 namespace zp::sim {
 

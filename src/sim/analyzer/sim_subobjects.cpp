@@ -5,7 +5,7 @@
 #include <cctype>
 #include <cmath>
 
-#include "sim/sim_handles.h"
+#include "sim/analyzer/sim_handles.h"
 
 namespace zp::sim {
 

@@ -6,7 +6,7 @@
 #include <string>
 
 #include "instruments/analyzer_automation.h"
-#include "sim/sim_call.h"
+#include "sim/analyzer/sim_call.h"
 
 namespace zp::sim {
 
