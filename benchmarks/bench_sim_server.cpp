@@ -17,8 +17,8 @@
 #include <string>
 #include <vector>
 
-#include "sim/server/scpi_server.h"
 #include "sim/generators/sim_generator.h"
+#include "sim/server/scpi_server.h"
 
 namespace {
 

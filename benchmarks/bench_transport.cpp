@@ -14,8 +14,8 @@
 #include <stdexcept>
 #include <string>
 
-#include "sim/server/scpi_server.h"
 #include "sim/generators/sim_generator.h"
+#include "sim/server/scpi_server.h"
 #include "transport/transport_factory.h"
 
 namespace {

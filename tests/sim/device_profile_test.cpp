@@ -9,8 +9,8 @@
 
 #include "core/numeric.h"
 #include "sim/analyzer/sim_analyzer_state.h"
-#include "sim/sim_bench.h"
 #include "sim/generators/wiring.h"
+#include "sim/sim_bench.h"
 
 namespace zp::sim {
 namespace {
