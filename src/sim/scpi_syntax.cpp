@@ -109,6 +109,27 @@ ProgramHeader parseHeader(std::string_view header) {
     return result;
 }
 
+bool matchesPattern(std::span<const char* const> pattern, std::span<const HeaderNode> nodes,
+                    std::optional<int>& suffix) {
+    if (pattern.empty()) return nodes.empty();
+    std::string_view keyword = pattern.front();
+    const bool optional = keyword.front() == '[';
+    if (optional) keyword = keyword.substr(1, keyword.size() - 2);
+    const bool takesSuffix = keyword.back() == '#';
+    if (takesSuffix) keyword.remove_suffix(1);
+
+    if (optional && matchesPattern(pattern.subspan(1), nodes, suffix)) return true;
+    if (nodes.empty()) return false;
+    const HeaderNode& node = nodes.front();
+    if (!matchesKeyword(node.mnemonic, keyword)) return false;
+    if (node.suffix && !takesSuffix) return false;
+    const auto saved = suffix;
+    if (takesSuffix) suffix = node.suffix;
+    if (matchesPattern(pattern.subspan(1), nodes.subspan(1), suffix)) return true;
+    suffix = saved;
+    return false;
+}
+
 double parseNumber(std::string_view text, ScpiUnit unit) {
     const std::string_view t = trim(text);
     if (t.empty()) throw ScpiFailure{kMissingParameter};

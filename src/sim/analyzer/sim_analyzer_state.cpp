@@ -92,7 +92,7 @@ SimChannel SimAnalyzerState::makeChannel(int number) const {
 
 SimChannel& SimAnalyzerState::channel(int number) {
     SimChannel* found = findChannel(number);
-    if (found == nullptr) throw analyzerError(kSuffixOutOfRange);
+    if (found == nullptr) throw analyzerError(kHeaderSuffixOutOfRange);
     return *found;
 }
 
@@ -108,7 +108,7 @@ std::vector<int> SimAnalyzerState::channelNumbers() const {
 }
 
 void SimAnalyzerState::copyChannel(int from, int to) {
-    if (to < 1 || to > kMaxChannel) throw analyzerError(kSuffixOutOfRange);
+    if (to < 1 || to > kMaxChannel) throw analyzerError(kHeaderSuffixOutOfRange);
     SimChannel copy = channel(from);
     copy.number = to;
     copy.inSetup = false;

@@ -10,4 +10,8 @@ InstrumentError analyzerError(std::string description) {
     return InstrumentError(end == description.c_str() ? 1 : number, std::move(description));
 }
 
+InstrumentError analyzerError(ScpiErrorCode error) {
+    return InstrumentError(error.code, std::to_string(error.code) + " " + error.text);
+}
+
 }  // namespace zp::sim

@@ -4,17 +4,12 @@
 #include <string>
 
 #include "instruments/instrument_error.h"
+#include "sim/scpi_syntax.h"
 
 namespace zp::sim {
 
 // "-113 Undefined header" -> InstrumentError(-113, "-113 Undefined header").
 InstrumentError analyzerError(std::string description);
-
-inline constexpr const char* kUndefinedHeader = "-113 Undefined header";
-inline constexpr const char* kSuffixOutOfRange = "-114 Header suffix out of range";
-inline constexpr const char* kMissingParameter = "-109 Missing parameter";
-inline constexpr const char* kDataOutOfRange = "-222 Data out of range";
-inline constexpr const char* kIllegalValue = "-224 Illegal parameter value";
-inline constexpr const char* kSettingsConflict = "-221 Settings conflict";
+InstrumentError analyzerError(ScpiErrorCode error);
 
 }  // namespace zp::sim

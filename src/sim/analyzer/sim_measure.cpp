@@ -65,7 +65,7 @@ bool isMeasurableParameter(std::string_view parameter, int ports) {
 std::complex<double> SimAnalyzerState::measure(const SimChannel& ch, const std::string& parameter,
                                                int point) const {
     const auto p = parseParameter(parameter, model_.ports);
-    if (!p) throw analyzerError(kIllegalValue);
+    if (!p) throw analyzerError(kIllegalParameterValue);
     const int sourcePort = p->kind == Kind::SParameter ? p->sourcePort : ch.sourcePort;
     const PulseWindow source = signalOf(ch, Wiring::kSourceElement, 0, point, generators_, wiring_);
 

@@ -2,87 +2,32 @@
 // others the program sends. Every failing command raises its SCPI error instead of queueing it.
 
 #include <algorithm>
-#include <cctype>
 #include <cmath>
 #include <cstdio>
 #include <optional>
+#include <span>
 
+#include "core/text.h"
 #include "sim/analyzer/sim_analyzer_state.h"
 #include "sim/analyzer/sim_errors.h"
+#include "sim/scpi_syntax.h"
 
 namespace zp::sim {
 
 namespace {
 
-struct Node {
-    std::string word;  // upper case, without its suffix
-    std::optional<int> suffix;
-};
-
-struct Command {
-    std::vector<Node> nodes;
+struct Context {
+    SimAnalyzerState& state;
     bool query = false;
+    std::optional<int> suffix;  // of CALCulate or SENSe: the channel
     std::vector<std::string> arguments;
+
+    SimChannel& channel() { return state.channel(suffix.value_or(1)); }
 };
 
-std::string upper(std::string_view text) {
-    std::string out(text);
-    for (auto& c : out) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    return out;
-}
-
-std::string_view trim(std::string_view text) {
-    const auto blank = [](char c) { return std::isspace(static_cast<unsigned char>(c)) != 0; };
-    while (!text.empty() && blank(text.front())) text.remove_prefix(1);
-    while (!text.empty() && blank(text.back())) text.remove_suffix(1);
-    return text;
-}
-
-// "CALCulate" matches CALC and CALCULATE.
-bool is(const Node& node, std::string_view keyword) {
-    std::string shortForm;
-    for (const char c : keyword) {
-        if (std::isupper(static_cast<unsigned char>(c))) shortForm += c;
-    }
-    return node.word == shortForm || node.word == upper(keyword);
-}
-
-Command split(std::string_view text) {
-    text = trim(text);
-    const auto space = text.find_first_of(" \t");
-    std::string_view header = text.substr(0, space);
-    const std::string_view rest = space == std::string_view::npos ? "" : trim(text.substr(space));
-
-    Command command;
-    if (!header.empty() && header.back() == '?') {
-        command.query = true;
-        header.remove_suffix(1);
-    }
-    if (!header.empty() && header.front() == ':') header.remove_prefix(1);
-    if (header.empty()) throw analyzerError(kUndefinedHeader);
-    std::size_t start = 0;
-    while (start <= header.size()) {
-        const auto colon = header.find(':', start);
-        const std::string_view part = header.substr(start, colon - start);
-        auto digits = part.find_first_of("0123456789");
-        Node node;
-        node.word = upper(part.substr(0, digits));
-        if (node.word.empty()) throw analyzerError(kUndefinedHeader);
-        if (digits != std::string_view::npos) {
-            int value = 0;
-            for (const char c : part.substr(digits)) {
-                if (!std::isdigit(static_cast<unsigned char>(c)) || value > 100000) {
-                    throw analyzerError(kUndefinedHeader);
-                }
-                value = value * 10 + (c - '0');
-            }
-            node.suffix = value;
-        }
-        command.nodes.push_back(std::move(node));
-        if (colon == std::string_view::npos) break;
-        start = colon + 1;
-    }
-
+// Arguments split on commas outside quotes; blanks around each are dropped.
+std::vector<std::string> splitArguments(std::string_view rest) {
+    std::vector<std::string> arguments;
     std::string current;
     char quote = 0;
     for (const char c : rest) {
@@ -93,35 +38,26 @@ Command split(std::string_view text) {
             quote = c;
             current += c;
         } else if (c == ',') {
-            command.arguments.emplace_back(trim(current));
+            arguments.emplace_back(trim(current, kWhitespace));
             current.clear();
         } else {
             current += c;
         }
     }
-    if (quote != 0) throw analyzerError("-150 String data error");
-    if (!rest.empty()) command.arguments.emplace_back(trim(current));
-    return command;
+    if (quote != 0) throw analyzerError(kStringDataError);
+    if (!rest.empty()) arguments.emplace_back(trim(current, kWhitespace));
+    return arguments;
 }
 
-bool matches(const Command& c, std::initializer_list<std::string_view> keywords) {
-    if (c.nodes.size() != keywords.size()) return false;
-    std::size_t i = 0;
-    for (const auto keyword : keywords) {
-        if (!is(c.nodes[i++], keyword)) return false;
-    }
-    return true;
-}
-
-const std::string& argument(const Command& c, std::size_t index) {
+const std::string& argument(const Context& c, std::size_t index) {
     if (index >= c.arguments.size() || c.arguments[index].empty()) {
         throw analyzerError(kMissingParameter);
     }
     return c.arguments[index];
 }
 
-void expectArguments(const Command& c, std::size_t count) {
-    if (c.arguments.size() > count) throw analyzerError("-108 Parameter not allowed");
+void expectArguments(const Context& c, std::size_t count) {
+    if (c.arguments.size() > count) throw analyzerError(kParameterNotAllowed);
     if (c.arguments.size() < count) throw analyzerError(kMissingParameter);
 }
 
@@ -139,9 +75,9 @@ int wholeNumber(const std::string& text) {
     try {
         value = std::stoi(text, &used);
     } catch (const std::exception&) {
-        throw analyzerError("-104 Data type error");
+        throw analyzerError(kDataTypeError);
     }
-    if (used != text.size()) throw analyzerError("-104 Data type error");
+    if (used != text.size()) throw analyzerError(kDataTypeError);
     return value;
 }
 
@@ -149,10 +85,17 @@ bool onOff(const std::string& text) {
     const std::string word = upper(text);
     if (word == "ON" || word == "1") return true;
     if (word == "OFF" || word == "0") return false;
-    throw analyzerError(kIllegalValue);
+    throw analyzerError(kIllegalParameterValue);
 }
 
-std::string catalog(const SimChannel& ch) {
+std::string helpFile(Context& c) {
+    expectArguments(c, 0);
+    return "\"" + c.state.helpFilePath() + "\"\n";
+}
+
+std::string catalog(Context& c) {
+    expectArguments(c, 0);
+    const SimChannel& ch = c.channel();
     if (ch.measurements.empty()) return "\"NO CATALOG\"\n";
     std::string reply = "\"";
     for (const auto& m : ch.measurements) {
@@ -162,7 +105,60 @@ std::string catalog(const SimChannel& ch) {
     return reply + "\"\n";
 }
 
-std::string sdata(const SimChannel& ch, bool malformed) {
+std::string define(Context& c) {
+    expectArguments(c, 2);
+    SimChannel& ch = c.channel();
+    const std::string name = unquote(argument(c, 0));
+    const std::string parameter = upper(unquote(argument(c, 1)));
+    if (name.empty()) throw analyzerError(kIllegalParameterValue);
+    if (!isMeasurableParameter(parameter, c.state.model().ports)) {
+        throw analyzerError(kIllegalParameterValue);
+    }
+    if (ch.findMeasurement(name) != nullptr) throw analyzerError(kSettingsConflict);
+    ch.measurements.push_back({name, parameter, 0, {}});
+    ch.measurements.back().data.assign(static_cast<std::size_t>(ch.points), {});
+    return "";
+}
+
+std::string select(Context& c) {
+    expectArguments(c, 1);
+    SimChannel& ch = c.channel();
+    const std::string name = unquote(argument(c, 0));
+    if (ch.findMeasurement(name) == nullptr) throw analyzerError(kIllegalParameterValue);
+    ch.selected = name;
+    return "";
+}
+
+std::string modify(Context& c) {
+    expectArguments(c, 1);
+    SimChannel& ch = c.channel();
+    const std::string parameter = upper(unquote(argument(c, 0)));
+    if (!isMeasurableParameter(parameter, c.state.model().ports)) {
+        throw analyzerError(kIllegalParameterValue);
+    }
+    SimMeasurement* m = ch.findMeasurement(ch.selected);
+    if (m == nullptr) throw analyzerError(kSettingsConflict);
+    m->parameter = parameter;
+    m->data.assign(static_cast<std::size_t>(ch.points), {});
+    return "";
+}
+
+std::string remove(Context& c) {
+    expectArguments(c, 1);
+    SimChannel& ch = c.channel();
+    const std::string name = unquote(argument(c, 0));
+    const auto it = std::find_if(ch.measurements.begin(), ch.measurements.end(),
+                                 [&](const SimMeasurement& m) { return m.name == name; });
+    if (it == ch.measurements.end()) throw analyzerError(kIllegalParameterValue);
+    ch.measurements.erase(it);
+    if (ch.selected == name) ch.selected.clear();
+    return "";
+}
+
+std::string data(Context& c) {
+    expectArguments(c, 1);
+    if (upper(argument(c, 0)) != "SDATA") throw analyzerError(kIllegalParameterValue);
+    const SimChannel& ch = c.channel();
     const SimMeasurement* m = nullptr;
     for (const auto& candidate : ch.measurements) {
         if (candidate.name == ch.selected) m = &candidate;
@@ -174,12 +170,75 @@ std::string sdata(const SimChannel& ch, bool malformed) {
         if (!reply.empty()) reply += ',';
         reply += sdataField(value.real()) + "," + sdataField(value.imag());
     }
-    if (malformed) {
+    if (c.state.malformedData()) {
         // A block cut short in the middle of a field, with a garbled character in it.
         reply.resize(std::max<std::size_t>(reply.size() / 2, 9) - 3);
         if (reply.size() > 4) reply[4] = '#';
     }
     return reply + "\n";
+}
+
+std::string sourcePort(Context& c) {
+    SimChannel& ch = c.channel();
+    if (c.query) return std::to_string(ch.sourcePort) + "\n";
+    expectArguments(c, 1);
+    const int port = wholeNumber(argument(c, 0));
+    if (port < 1 || port > c.state.model().ports) throw analyzerError(kDataOutOfRange);
+    ch.sourcePort = port;
+    return "";
+}
+
+std::string correction(Context& c) {
+    SimChannel& ch = c.channel();
+    if (c.query) return ch.correction ? "1\n" : "0\n";
+    expectArguments(c, 1);
+    ch.correction = onOff(argument(c, 0));
+    return "";
+}
+
+std::string sweepMode(Context& c) {
+    SimChannel& ch = c.channel();
+    if (c.query) return ch.sweepMode + "\n";
+    expectArguments(c, 1);
+    const std::string mode = upper(argument(c, 0));
+    const std::pair<const char*, const char*> modes[] = {
+        {"CONT", "CONTINUOUS"}, {"HOLD", "HOLD"}, {"SING", "SINGLE"}, {"GRO", "GROUPS"}};
+    for (const auto& [shortForm, longForm] : modes) {
+        if (mode == shortForm || mode == longForm) {
+            ch.sweepMode = shortForm;
+            return "";
+        }
+    }
+    throw analyzerError(kIllegalParameterValue);
+}
+
+enum class Form { Query, Command, Both };
+
+// The "#" node takes the channel number (1 when not written).
+struct CommandSpec {
+    std::vector<const char*> pattern;
+    Form form;
+    std::string (*action)(Context&);
+};
+
+const std::vector<CommandSpec>& commandTable() {
+    static const std::vector<CommandSpec> table = {
+        {{"DIAGnostic", "HELP", "FILE"}, Form::Query, helpFile},
+        {{"CALCulate#", "PARameter", "CATalog"}, Form::Query, catalog},
+        {{"CALCulate#", "PARameter", "DEFine"}, Form::Command, define},
+        {{"CALCulate#", "PARameter", "SELect"}, Form::Command, select},
+        {{"CALCulate#", "PARameter", "MODify"}, Form::Command, modify},
+        {{"CALCulate#", "PARameter", "DELete"}, Form::Command, remove},
+        {{"CALCulate#", "DATA"}, Form::Query, data},
+        {{"SENSe#", "SWEep", "SRCPort"}, Form::Both, sourcePort},
+        {{"SENSe#", "CORRection", "[STATe]"}, Form::Both, correction},
+        {{"SENSe#", "SWEep", "MODE"}, Form::Both, sweepMode},
+    };
+    return table;
+}
+
+bool takes(Form form, bool query) {
+    return form == Form::Both || (form == Form::Query) == query;
 }
 
 }  // namespace
@@ -196,97 +255,31 @@ std::string sdataField(double value) {
 }
 
 std::string SimAnalyzerState::parse(const std::string& text) {
-    const Command c = split(text);
-    const auto channelOf = [&]() -> SimChannel& { return channel(c.nodes[0].suffix.value_or(1)); };
+    const std::string_view line = trim(text, kWhitespace);
+    const std::size_t blank = line.find_first_of(" \t");
+    const std::string_view header = line.substr(0, blank);
+    const std::string_view rest =
+        blank == std::string_view::npos ? "" : trim(line.substr(blank), kWhitespace);
 
-    if (matches(c, {"*IDN"}) && c.query) {
-        return "Korvex," + model_.modelText + ",SIM000001,A.01.00\n";
+    // The one common command the program sends.
+    if (!header.empty() && header.front() == '*') {
+        splitArguments(rest);
+        if (upper(header) == "*IDN?") return "Korvex," + model_.modelText + ",SIM000001,A.01.00\n";
+        throw analyzerError(kUndefinedHeader);
     }
-    if (matches(c, {"DIAGnostic", "HELP", "FILE"}) && c.query) {
-        expectArguments(c, 0);
-        return "\"" + helpFilePath() + "\"\n";
+    ProgramHeader parsed;
+    try {
+        parsed = parseHeader(header);
+    } catch (const ScpiFailure&) {
+        throw analyzerError(kUndefinedHeader);
     }
-    if (matches(c, {"CALCulate", "PARameter", "CATalog"}) && c.query) {
-        expectArguments(c, 0);
-        return catalog(channelOf());
-    }
-    if (matches(c, {"CALCulate", "PARameter", "DEFine"}) && !c.query) {
-        expectArguments(c, 2);
-        SimChannel& ch = channelOf();
-        const std::string name = unquote(argument(c, 0));
-        const std::string parameter = upper(unquote(argument(c, 1)));
-        if (name.empty()) throw analyzerError(kIllegalValue);
-        if (!isMeasurableParameter(parameter, model_.ports)) throw analyzerError(kIllegalValue);
-        if (ch.findMeasurement(name) != nullptr) throw analyzerError(kSettingsConflict);
-        ch.measurements.push_back({name, parameter, 0, {}});
-        ch.measurements.back().data.assign(static_cast<std::size_t>(ch.points), {});
-        return "";
-    }
-    if (matches(c, {"CALCulate", "PARameter", "SELect"}) && !c.query) {
-        expectArguments(c, 1);
-        SimChannel& ch = channelOf();
-        const std::string name = unquote(argument(c, 0));
-        if (ch.findMeasurement(name) == nullptr) throw analyzerError(kIllegalValue);
-        ch.selected = name;
-        return "";
-    }
-    if (matches(c, {"CALCulate", "PARameter", "MODify"}) && !c.query) {
-        expectArguments(c, 1);
-        SimChannel& ch = channelOf();
-        const std::string parameter = upper(unquote(argument(c, 0)));
-        if (!isMeasurableParameter(parameter, model_.ports)) throw analyzerError(kIllegalValue);
-        SimMeasurement* m = ch.findMeasurement(ch.selected);
-        if (m == nullptr) throw analyzerError(kSettingsConflict);
-        m->parameter = parameter;
-        m->data.assign(static_cast<std::size_t>(ch.points), {});
-        return "";
-    }
-    if (matches(c, {"CALCulate", "PARameter", "DELete"}) && !c.query) {
-        expectArguments(c, 1);
-        SimChannel& ch = channelOf();
-        const std::string name = unquote(argument(c, 0));
-        const auto it = std::find_if(ch.measurements.begin(), ch.measurements.end(),
-                                     [&](const SimMeasurement& m) { return m.name == name; });
-        if (it == ch.measurements.end()) throw analyzerError(kIllegalValue);
-        ch.measurements.erase(it);
-        if (ch.selected == name) ch.selected.clear();
-        return "";
-    }
-    if (matches(c, {"CALCulate", "DATA"}) && c.query) {
-        expectArguments(c, 1);
-        if (upper(argument(c, 0)) != "SDATA") throw analyzerError(kIllegalValue);
-        return sdata(channelOf(), malformedData());
-    }
-    if (matches(c, {"SENSe", "SWEep", "SRCPort"})) {
-        SimChannel& ch = channelOf();
-        if (c.query) return std::to_string(ch.sourcePort) + "\n";
-        expectArguments(c, 1);
-        const int port = wholeNumber(argument(c, 0));
-        if (port < 1 || port > model_.ports) throw analyzerError(kDataOutOfRange);
-        ch.sourcePort = port;
-        return "";
-    }
-    if (matches(c, {"SENSe", "CORRection"}) || matches(c, {"SENSe", "CORRection", "STATe"})) {
-        SimChannel& ch = channelOf();
-        if (c.query) return ch.correction ? "1\n" : "0\n";
-        expectArguments(c, 1);
-        ch.correction = onOff(argument(c, 0));
-        return "";
-    }
-    if (matches(c, {"SENSe", "SWEep", "MODE"})) {
-        SimChannel& ch = channelOf();
-        if (c.query) return ch.sweepMode + "\n";
-        expectArguments(c, 1);
-        const std::string mode = upper(argument(c, 0));
-        const std::pair<const char*, const char*> modes[] = {
-            {"CONT", "CONTINUOUS"}, {"HOLD", "HOLD"}, {"SING", "SINGLE"}, {"GRO", "GROUPS"}};
-        for (const auto& [shortForm, longForm] : modes) {
-            if (mode == shortForm || mode == longForm) {
-                ch.sweepMode = shortForm;
-                return "";
-            }
+    Context context{*this, parsed.query, std::nullopt, splitArguments(rest)};
+    for (const CommandSpec& entry : commandTable()) {
+        context.suffix.reset();
+        if (takes(entry.form, parsed.query) &&
+            matchesPattern(entry.pattern, parsed.nodes, context.suffix)) {
+            return entry.action(context);
         }
-        throw analyzerError(kIllegalValue);
     }
     throw analyzerError(kUndefinedHeader);
 }
