@@ -4,6 +4,7 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "common/cli_actions.h"
 #include "sim/faults.h"
 #include "transport/transport_factory.h"
 
@@ -39,6 +40,24 @@ std::string checkAnalyzer(const std::string& value, std::string& model) {
     }
     model = name;
     return {};
+}
+
+// Each action's usage with its help beside it, or below it when the usage is too long.
+void printActionHelp(std::ostream& out) {
+    constexpr std::size_t kHelpColumn = 30;
+    for (const ActionKind& kind : actionTable()) {
+        std::string line = "  " + kind.usage;
+        std::istringstream help(kind.help);
+        for (std::string text; std::getline(help, text); line.clear()) {
+            if (line.size() + 2 > kHelpColumn) {
+                out << line << '\n';
+                line.clear();
+            }
+            line.resize(kHelpColumn, ' ');
+            out << line << text << '\n';
+        }
+        if (!line.empty()) out << line << '\n';
+    }
 }
 
 }  // namespace
@@ -178,14 +197,8 @@ std::string usageText(Program program) {
     out << "  --help, -h            show this help and exit\n"
            "  --version             show the version and exit\n";
     if (cli) {
-        out << "\nActions (run in order; the first failure ends the run with status 1):\n"
-               "  set prf|pri|ifbw VALUE        e.g. set prf 10k, set pri 200us\n"
-               "  set width|delay ROW VALUE     e.g. set width 0 2.5us\n"
-               "  set fixedprf|converter|nopg|noswgating|pulsed on|off\n"
-               "  step prf|pri|ifbw up|down     step width|delay ROW up|down\n"
-               "  calculate                     solve the timing\n"
-               "  show                          print the main window state as JSON\n"
-               "  help                          print the help file the analyzer reports\n";
+        out << "\nActions (run in order; the first failure ends the run with status 1):\n";
+        printActionHelp(out);
     }
     out << "\nExit status: 0 success, 1 failure, 2 bad command line.\n";
     return out.str();

@@ -237,11 +237,16 @@ const std::string& WordCursor::next(const std::string& action, const std::string
 
 const std::vector<ActionKind>& actionTable() {
     static const std::vector<ActionKind> kTable = {
-        {"set", "set FIELD [ROW] VALUE | set TOGGLE on|off", parseSet},
-        {"step", "step FIELD [ROW] up|down", parseStep},
-        {"calculate", "calculate", parseCalculate},
-        {"show", "show", parseShow},
-        {"help", "help", parseHelp},
+        {"set", "set FIELD [ROW] VALUE | set TOGGLE on|off", parseSet,
+         "type VALUE into a field, or set a toggle\n"
+         "FIELD: prf|pri|ifbw|width ROW|delay ROW\n"
+         "TOGGLE: fixedprf|converter|nopg|noswgating|pulsed\n"
+         "VALUE: a number with a unit, e.g. 10k, 200us"},
+        {"step", "step FIELD [ROW] up|down", parseStep,
+         "one step of the field, as the arrow keys do"},
+        {"calculate", "calculate", parseCalculate, "solve the timing"},
+        {"show", "show", parseShow, "print the main window state as JSON"},
+        {"help", "help", parseHelp, "print the help file the analyzer reports"},
     };
     return kTable;
 }

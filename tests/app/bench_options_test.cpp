@@ -5,6 +5,7 @@
 
 #include "common/bench_options.h"
 #include "common/bench_wiring.h"
+#include "common/cli_actions.h"
 
 namespace zp::app {
 namespace {
@@ -121,8 +122,26 @@ TEST(BenchOptions, EarlyExitsAnswerHelpVersionModelsAndUsageErrors) {
     const std::string models = modelListText();
     EXPECT_NE(models.find("kt655\tKT655A\tK71 M83 M84\t4\t3\n"), std::string::npos) << models;
     EXPECT_NE(models.find("kt611\tKT611A\t-\t2\t1\n"), std::string::npos) << models;
-    EXPECT_NE(usageText(Program::Cli).find("calculate"), std::string::npos);
     EXPECT_EQ(usageText(Program::Gui).find("calculate"), std::string::npos);
+}
+
+TEST(BenchOptions, TheActionHelpComesFromTheActionTable) {
+    const std::string usage = usageText(Program::Cli);
+    const std::string actions = usage.substr(usage.find("\nActions"));
+    EXPECT_EQ(actions.substr(actions.find("  step")),
+              "  step FIELD [ROW] up|down    one step of the field, as the arrow keys do\n"
+              "  calculate                   solve the timing\n"
+              "  show                        print the main window state as JSON\n"
+              "  help                        print the help file the analyzer reports\n"
+              "\nExit status: 0 success, 1 failure, 2 bad command line.\n");
+    // A usage too long for the column has its help below it.
+    EXPECT_NE(actions.find("\n  set FIELD [ROW] VALUE | set TOGGLE on|off\n" +
+                           std::string(30, ' ') + "type VALUE"),
+              std::string::npos)
+        << actions;
+    for (const ActionKind& kind : actionTable()) {
+        EXPECT_NE(actions.find("\n  " + kind.usage), std::string::npos) << kind.name;
+    }
 }
 
 }  // namespace
