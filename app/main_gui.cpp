@@ -1,5 +1,5 @@
-// zentra-pulse: the Qt front end. One instance per user; a second start brings the first to the
-// front and ends.
+// zentra-pulse: the Qt front end. One instance per user and display; a second start brings the
+// first to the front and ends.
 
 #include <QApplication>
 #include <QDir>
@@ -45,6 +45,7 @@ class GuiFrontEnd : public FrontEnd {
         instance_ = std::make_unique<zp::ui::SingleInstance>(zp::ui::SingleInstance::defaultKey());
         screenshot_ = cmd.options.screenshot;
         if (!screenshot_ && instance_->start() == zp::ui::SingleInstance::Role::Secondary) {
+            std::cerr << "zentra-pulse: already running on this display; brought it to the front\n";
             return 0;
         }
         ui_ = std::make_unique<zp::ui::QtInteraction>(manualFolders());
@@ -57,7 +58,8 @@ class GuiFrontEnd : public FrontEnd {
     void showStartupFailure(StartupFailure failure, const std::string& text) override {
         ui_->message(failure == StartupFailure::AnalyzerUnreachable
                          ? "The analyzer cannot be reached: " + text + "\nThe program ends."
-                         : "The program could not start: " + text);
+                         : "The program could not start: " + text,
+                     zp::MessageKind::Warning);
     }
 
     int run(zp::MainForm& form, zp::Bench&) override {

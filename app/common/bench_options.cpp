@@ -194,6 +194,8 @@ std::string usageText(Program program) {
            "  --fault FAULT         make the simulated bench fail (repeatable): analyzer:OP=TEXT,\n"
            "                        noidn:ADDR, generror:ADDR=ENTRY, timeout:ADDR, baddata\n";
     if (cli) out << "  --yes, -y             answer yes to every question\n";
+    if (!cli)
+        out << "  --screenshot FILE     start unattended, save the window as PNG FILE, exit\n";
     out << "  --help, -h            show this help and exit\n"
            "  --version             show the version and exit\n";
     if (cli) {

@@ -23,7 +23,7 @@ struct BenchOptions {
     bool version = false;
     // zentra-pulse-cli only.
     bool yes = false;
-    // zentra-pulse only (hidden): render the main window to this PNG after start-up and end.
+    // zentra-pulse only: render the main window to this PNG after start-up and end.
     std::optional<std::string> screenshot;
 };
 

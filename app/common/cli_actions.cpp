@@ -11,15 +11,58 @@
 namespace zp::app {
 namespace {
 
-enum class FieldKind { Prf, Pri, Ifbw, Width, Delay };
+// The words of `set` and `step` and the window control each one drives: the documented words stay
+// while the window's names are its own.
+enum class Takes { Value, RowValue, OnOff };
 
-struct FieldRef {
-    FieldKind kind;
-    std::string name;  // as typed
-    int row = -1;      // width and delay only
+struct Word {
+    const char* word;
+    const char* control;
+    Takes takes;
 };
 
-enum class ToggleKind { FixedPrf, Converter, NoPg, NoSwGating, Pulsed };
+constexpr Word kWords[] = {
+    {"prf", "VexoEdit_prf", Takes::Value},          {"pri", "VexoEdit_pri", Takes::Value},
+    {"ifbw", "VexoEdit_IFBW", Takes::Value},        {"width", "VexoEdit_width", Takes::RowValue},
+    {"delay", "VexoEdit_delay", Takes::RowValue},   {"fixedprf", "chk_FixedPRF", Takes::OnOff},
+    {"converter", "m_ConverterMeas", Takes::OnOff}, {"nopg", "m_NoPG", Takes::OnOff},
+    {"noswgating", "m_NoSWGating", Takes::OnOff},   {"pulsed", "chk_pulsed", Takes::OnOff},
+};
+
+const Word* findWord(const std::string& word) {
+    for (const Word& w : kWords) {
+        if (word == w.word) return &w;
+    }
+    return nullptr;
+}
+
+// "prf, pri, ..." for the words `set` (all) or `step` (fields only, rows named) take.
+std::string wordList(bool fieldsOnly) {
+    std::string list;
+    for (const Word& w : kWords) {
+        if (fieldsOnly && w.takes == Takes::OnOff) continue;
+        list += (list.empty() ? "" : ", ") + std::string(w.word);
+        if (fieldsOnly && w.takes == Takes::RowValue) list += " ROW";
+    }
+    return list;
+}
+
+// "prf|pri|ifbw|width ROW|delay ROW" or the toggles, for --help.
+std::string helpWords(bool toggles) {
+    std::string list;
+    for (const Word& w : kWords) {
+        if ((w.takes == Takes::OnOff) != toggles) continue;
+        list += (list.empty() ? "" : "|") + std::string(w.word);
+        if (w.takes == Takes::RowValue) list += " ROW";
+    }
+    return list;
+}
+
+// A field of the window as the words name it.
+struct FieldRef {
+    const Word* word;
+    int row = -1;  // width and delay only
+};
 
 int parseRow(const std::string& action, const std::string& word) {
     int row = -1;
@@ -37,47 +80,30 @@ bool parseOnOff(const std::string& action, const std::string& word) {
     throw ActionError(action + ": expected on or off, not '" + word + "'");
 }
 
-std::optional<FieldKind> fieldKind(const std::string& name) {
-    static const std::pair<const char*, FieldKind> kFields[] = {{"prf", FieldKind::Prf},
-                                                                {"pri", FieldKind::Pri},
-                                                                {"ifbw", FieldKind::Ifbw},
-                                                                {"width", FieldKind::Width},
-                                                                {"delay", FieldKind::Delay}};
-    for (const auto& [text, kind] : kFields) {
-        if (name == text) return kind;
-    }
-    return std::nullopt;
-}
-
-// Takes a field name and, for width and delay, its row.
-std::optional<FieldRef> takeField(WordCursor& words, const std::string& action) {
-    std::optional<FieldKind> kind = fieldKind(words.peek());
-    if (!kind) return std::nullopt;
-    FieldRef ref{*kind, words.next(action, "FIELD"), -1};
-    if (ref.kind == FieldKind::Width || ref.kind == FieldKind::Delay) {
-        ref.row = parseRow(action + " " + ref.name, words.next(action + " " + ref.name, "ROW"));
+// Takes the row of a width or delay after the field's word.
+FieldRef takeRow(WordCursor& words, const std::string& action, const Word& word) {
+    FieldRef ref{&word, -1};
+    if (word.takes == Takes::RowValue) {
+        const std::string what = action + " " + word.word;
+        ref.row = parseRow(what, words.next(what, "ROW"));
     }
     return ref;
 }
 
-EntryField& fieldOf(MainForm& form, const FieldRef& ref) {
-    switch (ref.kind) {
-        case FieldKind::Prf:
-            return form.VexoEdit_prf;
-        case FieldKind::Pri:
-            return form.VexoEdit_pri;
-        case FieldKind::Ifbw:
-            return form.VexoEdit_IFBW;
-        case FieldKind::Width:
-        case FieldKind::Delay:
-            break;
-    }
-    if (ref.row >= form.rowCount()) {
+// The control's name in the window, e.g. "VexoEdit_width(2)"; a row the window lacks is refused.
+std::string controlName(const MainForm& form, const FieldRef& ref) {
+    if (ref.row < 0) return ref.word->control;
+    const int rows = form.controls().item(ref.word->control).rowCount();
+    if (ref.row >= rows) {
         throw ActionError("row " + std::to_string(ref.row) + " does not exist (rows 0 to " +
-                          std::to_string(form.rowCount() - 1) + " on this analyzer)");
+                          std::to_string(rows - 1) + " on this analyzer)");
     }
-    auto& fields = ref.kind == FieldKind::Width ? form.VexoEdit_width : form.VexoEdit_delay;
-    return fields[static_cast<std::size_t>(ref.row)];
+    return ControlRegistry::rowName(ref.word->control, ref.row);
+}
+
+std::string words(const std::string& action, const FieldRef& ref, const std::string& last) {
+    return action + " " + ref.word->word + (ref.row >= 0 ? " " + std::to_string(ref.row) : "") +
+           " " + last;
 }
 
 // The value in the field's base unit, e.g. "12340 Hz" or "2e-06 sec".
@@ -89,104 +115,58 @@ std::string baseText(const EntryField& field) {
     return text;
 }
 
-std::string menuCaption(const MenuEntry& entry) {
-    std::string text;
-    for (char c : entry.caption) {
-        if (c != '&') text += c;
-    }
-    return text;
+void refuseIf(const std::optional<std::string>& reason) {
+    if (reason) throw ActionError(*reason);
 }
 
-void setToggle(MainForm& form, ToggleKind kind, bool on) {
-    switch (kind) {
-        case ToggleKind::FixedPrf:
-            if (!form.chk_FixedPRF.enabled) throw ActionError("Fixed PRF is disabled");
-            form.setFixedPRF(on);
-            if (form.chk_FixedPRF.checked() != on) throw ActionError("Fixed PRF did not change");
-            return;
-        case ToggleKind::Pulsed:
-            if (!form.chk_pulsed.enabled) throw ActionError("Pulsed Mode On is disabled");
-            form.chk_pulsed.value = on ? kChecked : kUnchecked;
-            form.chk_pulsed_Click();
-            return;
-        case ToggleKind::Converter:
-        case ToggleKind::NoPg:
-        case ToggleKind::NoSwGating:
-            break;
+Action parseSet(WordCursor& cursor) {
+    const std::string& what = cursor.next("set", "FIELD");
+    if (cursor.atEnd()) throw ActionError("set " + what + ": missing value");
+    const Word* word = findWord(what);
+    if (word == nullptr) {
+        throw ActionError("set: unknown field '" + what + "' (" + wordList(false) + ")");
     }
-    MenuEntry& entry = kind == ToggleKind::Converter ? form.m_ConverterMeas
-                       : kind == ToggleKind::NoPg    ? form.m_NoPG
-                                                     : form.m_NoSWGating;
-    if (!entry.enabled || !entry.visible) {
-        throw ActionError(menuCaption(entry) + " is not available on this analyzer");
-    }
-    if (entry.checked == on) return;
-    if (kind == ToggleKind::Converter) form.m_ConverterMeas_Click();
-    if (kind == ToggleKind::NoPg) form.m_NoPG_Click();
-    if (kind == ToggleKind::NoSwGating) form.m_NoSWGating_Click();
-    if (entry.checked != on) throw ActionError(menuCaption(entry) + " did not change");
-}
-
-Action parseSet(WordCursor& words) {
-    const std::string& what = words.next("set", "FIELD");
-    if (words.atEnd()) throw ActionError("set " + what + ": missing value");
-    static const std::pair<const char*, ToggleKind> kToggles[] = {
-        {"fixedprf", ToggleKind::FixedPrf},
-        {"converter", ToggleKind::Converter},
-        {"nopg", ToggleKind::NoPg},
-        {"noswgating", ToggleKind::NoSwGating},
-        {"pulsed", ToggleKind::Pulsed}};
-    for (const auto& [text, kind] : kToggles) {
-        if (what != text) continue;
-        const std::string word = words.next("set " + what, "on|off");
-        const bool on = parseOnOff("set " + what, word);
-        Action a;
-        a.words = "set " + what + " " + word;
-        a.run = [kind, on, echo = a.words](ActionContext& ctx) {
-            setToggle(ctx.form, kind, on);
+    Action a;
+    if (word->takes == Takes::OnOff) {
+        const std::string state = cursor.next("set " + what, "on|off");
+        const bool on = parseOnOff("set " + what, state);
+        a.words = "set " + what + " " + state;
+        a.run = [control = std::string(word->control), on, echo = a.words](ActionContext& ctx) {
+            refuseIf(ctx.form.controls().setChecked(control, on));
             return echo + " -> " + (on ? "on" : "off");
         };
         return a;
     }
-    std::optional<FieldKind> kind = fieldKind(what);
-    if (!kind) {
-        throw ActionError("set: unknown field '" + what +
-                          "' (prf, pri, ifbw, width, delay, fixedprf, converter, nopg, "
-                          "noswgating, pulsed)");
-    }
-    std::optional<FieldRef> ref = FieldRef{*kind, what, -1};
-    if (ref->kind == FieldKind::Width || ref->kind == FieldKind::Delay) {
-        ref->row = parseRow("set " + what, words.next("set " + what, "ROW"));
-    }
-    const std::string value = words.next("set " + what, "VALUE");
-    Action a;
-    a.words = "set " + what + (ref->row >= 0 ? " " + std::to_string(ref->row) : "") + " " + value;
-    a.run = [field = *ref, value, echo = a.words](ActionContext& ctx) {
-        EntryField& f = fieldOf(ctx.form, field);
-        if (std::optional<std::string> reason = f.enterText(value)) throw ActionError(*reason);
-        return echo + " -> " + baseText(f);
+    const FieldRef ref = takeRow(cursor, "set", *word);
+    const std::string value = cursor.next("set " + what, "VALUE");
+    a.words = words("set", ref, value);
+    a.run = [ref, value, echo = a.words](ActionContext& ctx) {
+        const std::string name = controlName(ctx.form, ref);
+        refuseIf(ctx.form.controls().enterText(name, value));
+        return echo + " -> " + baseText(ctx.form.controls().field(name));
     };
     return a;
 }
 
-Action parseStep(WordCursor& words) {
-    if (words.atEnd()) throw ActionError("step: missing FIELD");
-    std::optional<FieldRef> ref = takeField(words, "step");
-    if (!ref) {
-        throw ActionError("step: unknown field '" + words.peek() +
-                          "' (prf, pri, ifbw, width ROW, delay ROW)");
+Action parseStep(WordCursor& cursor) {
+    if (cursor.atEnd()) throw ActionError("step: missing FIELD");
+    const Word* word = findWord(cursor.peek());
+    if (word == nullptr || word->takes == Takes::OnOff) {
+        throw ActionError("step: unknown field '" + cursor.peek() + "' (" + wordList(true) + ")");
     }
-    const std::string word = words.next("step " + ref->name, "up|down");
-    if (word != "up" && word != "down") {
-        throw ActionError("step " + ref->name + ": expected up or down, not '" + word + "'");
+    cursor.next("step", "FIELD");
+    const FieldRef ref = takeRow(cursor, "step", *word);
+    const std::string what = std::string("step ") + word->word;
+    const std::string direction = cursor.next(what, "up|down");
+    if (direction != "up" && direction != "down") {
+        throw ActionError(what + ": expected up or down, not '" + direction + "'");
     }
     Action a;
-    a.words =
-        "step " + ref->name + (ref->row >= 0 ? " " + std::to_string(ref->row) : "") + " " + word;
-    a.run = [field = *ref, direction = word == "up" ? 1 : -1, echo = a.words](ActionContext& ctx) {
-        EntryField& f = fieldOf(ctx.form, field);
-        if (std::optional<std::string> reason = f.step(direction)) throw ActionError(*reason);
-        return echo + " -> " + baseText(f);
+    a.words = words("step", ref, direction);
+    a.run = [ref, up = direction == "up", echo = a.words](ActionContext& ctx) {
+        const std::string name = controlName(ctx.form, ref);
+        refuseIf(ctx.form.controls().step(name, up ? 1 : -1));
+        return echo + " -> " + baseText(ctx.form.controls().field(name));
     };
     return a;
 }
@@ -201,7 +181,7 @@ Action plainAction(std::string words, std::function<std::string(ActionContext&)>
 
 Action parseCalculate(WordCursor&) {
     return plainAction("calculate", [](ActionContext& ctx) {
-        ctx.form.b_calculate_Click();
+        refuseIf(ctx.form.controls().click("b_calculate"));
         return "calculate -> PRF " + baseText(ctx.form.VexoEdit_prf) + ", IF bandwidth " +
                baseText(ctx.form.VexoEdit_IFBW) +
                (isTrue(ctx.form.state().NeedsCalculation) ? " (not solved)" : "");
@@ -217,8 +197,8 @@ Action parseShow(WordCursor&) {
 
 Action parseHelp(WordCursor&) {
     return plainAction("help", [](ActionContext& ctx) {
-        ctx.form.m_contents_Click();
-        std::optional<ConsoleInteraction::HelpRequest> request = ctx.ui.takeHelpRequest();
+        refuseIf(ctx.form.controls().click("m_contents"));
+        std::optional<HelpRequest> request = ctx.ui.takeHelpRequest();
         // Without a file the window has said why in a message, and that message is the failure.
         if (!request && ctx.ui.hasMessages()) return std::string();
         if (!request || request->file.empty()) {
@@ -238,10 +218,8 @@ const std::string& WordCursor::next(const std::string& action, const std::string
 const std::vector<ActionKind>& actionTable() {
     static const std::vector<ActionKind> kTable = {
         {"set", "set FIELD [ROW] VALUE | set TOGGLE on|off", parseSet,
-         "type VALUE into a field, or set a toggle\n"
-         "FIELD: prf|pri|ifbw|width ROW|delay ROW\n"
-         "TOGGLE: fixedprf|converter|nopg|noswgating|pulsed\n"
-         "VALUE: a number with a unit, e.g. 10k, 200us"},
+         "type VALUE into a field, or set a toggle\nFIELD: " + helpWords(false) +
+             "\nTOGGLE: " + helpWords(true) + "\nVALUE: a number with a unit, e.g. 10k, 200us"},
         {"step", "step FIELD [ROW] up|down", parseStep,
          "one step of the field, as the arrow keys do"},
         {"calculate", "calculate", parseCalculate, "solve the timing"},

@@ -20,7 +20,7 @@ std::string ConsoleInteraction::oneLine(const std::string& text) {
     return line;
 }
 
-void ConsoleInteraction::message(const std::string& text) {
+void ConsoleInteraction::message(const std::string& text, MessageKind) {
     std::string line = oneLine(text);
     out_ << "message: " << line << '\n';
     messages_.push_back(std::move(line));
@@ -39,8 +39,12 @@ std::optional<std::string> ConsoleInteraction::chooseSaveFile(const std::string&
     return std::exchange(nextFile_, std::nullopt);
 }
 
-bool ConsoleInteraction::showHelp(const std::string& file, int topic) {
-    help_ = HelpRequest{file, topic};
+bool ConsoleInteraction::showHelp(const HelpRequest& request) {
+    if (request.analyzerError) {
+        message(*request.analyzerError, MessageKind::Warning);
+        return false;
+    }
+    help_ = request;
     return true;
 }
 
@@ -48,7 +52,7 @@ std::vector<std::string> ConsoleInteraction::takeMessages() {
     return std::exchange(messages_, {});
 }
 
-std::optional<ConsoleInteraction::HelpRequest> ConsoleInteraction::takeHelpRequest() {
+std::optional<HelpRequest> ConsoleInteraction::takeHelpRequest() {
     return std::exchange(help_, std::nullopt);
 }
 

@@ -15,16 +15,17 @@ class ConsoleInteraction : public Interaction {
   public:
     ConsoleInteraction(std::ostream& out, bool answerYes) : out_(out), answerYes_(answerYes) {}
 
-    // Printed as "message: <text>" on one line (line breaks become blanks).
-    void message(const std::string& text) override;
+    // Printed as "message: <text>" on one line (line breaks become blanks), whatever the kind.
+    void message(const std::string& text, MessageKind kind) override;
     bool ask(const std::string& text) override;
     // The file set by the running action, used once; nothing means the person cancelled.
     std::optional<std::string> chooseOpenFile(const std::string& filter) override;
     std::optional<std::string> chooseSaveFile(const std::string& filter) override;
     void processEvents() override {}
     void setPointer(Pointer) override {}
-    // Remembers the file and topic; the help action prints them.
-    bool showHelp(const std::string& file, int topic) override;
+    // Remembers the file and topic; the help action prints them. Without a screen there is no
+    // manual to fall back on: the analyzer's error, when it named no file, is a message.
+    bool showHelp(const HelpRequest& request) override;
 
     void setNextFile(std::optional<std::string> file) { nextFile_ = std::move(file); }
 
@@ -32,10 +33,6 @@ class ConsoleInteraction : public Interaction {
     std::vector<std::string> takeMessages();
     bool hasMessages() const { return !messages_.empty(); }
 
-    struct HelpRequest {
-        std::string file;
-        int topic = 0;
-    };
     std::optional<HelpRequest> takeHelpRequest();
 
     // Line breaks become blanks: every report of this front end is one line.

@@ -58,7 +58,8 @@ std::size_t numberPrefixLength(std::string_view s) {
     return i;
 }
 
-std::optional<double> siMultiplier(char c) {
+// SI prefix letters, read with their case: "m" milli, "M" mega.
+std::optional<double> siPrefix(char c) {
     switch (c) {
         case 'p':
             return 1e-12;
@@ -69,7 +70,6 @@ std::optional<double> siMultiplier(char c) {
         case 'm':
             return 1e-3;
         case 'k':
-        case 'K':
             return 1e3;
         case 'M':
             return 1e6;
@@ -80,11 +80,58 @@ std::optional<double> siMultiplier(char c) {
     }
 }
 
+// SCPI prefix letters ignore case, so "M" is milli there too, except in MHZ and MOHM.
+std::optional<double> scpiPrefix(char c, std::string_view base) {
+    if (lower(c) == 'm') {
+        return equalsIgnoringCase(base, "hz") || equalsIgnoringCase(base, "ohm") ? 1e6 : 1e-3;
+    }
+    if (lower(c) == 'g') return 1e9;
+    return siPrefix(lower(c));  // p, n, u, k
+}
+
 // "sec" is also written "s", "msec" "ms" and so on.
 std::optional<std::string> shortForm(const std::string& name) {
     if (name.size() >= 3 && name.compare(name.size() - 3, 3, "sec") == 0) {
         return name.substr(0, name.size() - 2);
     }
+    return std::nullopt;
+}
+
+bool same(std::string_view a, std::string_view b, bool ignoreCase) {
+    return ignoreCase ? equalsIgnoringCase(a, b) : a == b;
+}
+
+// "." stands for "no unit" and is never typed.
+bool namesUnit(const Unit& u, std::string_view text, bool ignoreCase) {
+    if (u.name == ".") return false;
+    const auto s = shortForm(u.name);
+    return same(u.name, text, ignoreCase) || (s && same(*s, text, ignoreCase));
+}
+
+// The base unit is the one whose multiplier is 1: "sec" (or "s"), "Hz", "V", "ohm".
+bool namesBaseUnit(const std::vector<Unit>& units, std::string_view text, bool ignoreCase) {
+    return std::any_of(units.begin(), units.end(), [&](const Unit& u) {
+        return u.multiplier == 1.0 && namesUnit(u, text, ignoreCase);
+    });
+}
+
+// Exact SI spelling: a listed unit, a prefix letter alone or a prefix letter on the base unit.
+std::optional<double> exactFactor(const std::vector<Unit>& units, std::string_view text) {
+    for (const auto& u : units) {
+        if (namesUnit(u, text, false)) return u.multiplier;
+    }
+    const std::string_view tail = text.substr(1);
+    if (tail.empty() || namesBaseUnit(units, tail, false)) return siPrefix(text[0]);
+    return std::nullopt;
+}
+
+// The SCPI reading, for spellings no unit matches exactly: "MS", "KHZ", "mhz", "MOHM".
+std::optional<double> scpiFactor(const std::vector<Unit>& units, std::string_view text) {
+    for (const auto& u : units) {
+        if (namesUnit(u, text, true)) return u.multiplier;
+    }
+    const std::string_view tail = text.substr(1);
+    if (tail.empty() || namesBaseUnit(units, tail, true)) return scpiPrefix(text[0], tail);
     return std::nullopt;
 }
 
@@ -223,26 +270,9 @@ EntryField::Parsed EntryField::parse(std::string_view text) const {
     };
     if (rest.empty()) return accept(1.0);
 
-    // A unit of the list: exact first, so "M" (mega) and "m" stay apart, then ignoring case.
-    for (const auto& u : units_) {
-        if (u.name == rest || shortForm(u.name) == rest) return accept(u.multiplier);
-    }
-    for (const auto& u : units_) {
-        if (u.name.size() > 1 && equalsIgnoringCase(u.name, rest)) return accept(u.multiplier);
-        const auto s = shortForm(u.name);
-        if (s && s->size() > 1 && equalsIgnoringCase(*s, rest)) return accept(u.multiplier);
-    }
-    // A multiplier letter, optionally followed by the base unit: "10k", "10 kohm", "2.5us".
-    if (const auto m = siMultiplier(rest[0])) {
-        const std::string_view tail = std::string_view(rest).substr(1);
-        bool ok = tail.empty();
-        for (const auto& u : units_) {
-            if (u.multiplier != 1.0 || u.name == ".") continue;
-            const auto s = shortForm(u.name);
-            if (equalsIgnoringCase(u.name, tail) || (s && equalsIgnoringCase(*s, tail))) ok = true;
-        }
-        if (ok) return accept(*m);
-    }
+    // Exact first, so that "mHz" is millihertz while "MHZ" and "mhz" are megahertz as in SCPI.
+    if (const auto m = exactFactor(units_, rest)) return accept(*m);
+    if (const auto m = scpiFactor(units_, rest)) return accept(*m);
 
     std::string hint;
     if (isPlainList(units_)) {

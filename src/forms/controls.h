@@ -1,7 +1,6 @@
 #pragma once
 // Plain-data stand-ins for a window's controls: what a view shows and what the rules change.
 
-#include <functional>
 #include <string>
 
 #include "core/bool16.h"
@@ -33,5 +32,8 @@ struct CheckBox : Control {
 struct MenuEntry : Control {
     bool checked = false;
 };
+
+// A caption as a sentence names it: "&Pulse Profile..." -> "Pulse Profile" ("&&" is a literal &).
+std::string plainCaption(const std::string& caption);
 
 }  // namespace zp

@@ -22,23 +22,8 @@ constexpr const char* kFourPortCaptions[] = {
     "A IF Gate :", "B IF Gate :", "C IF Gate :", "D IF Gate :"};
 constexpr const char* kSixthRowCaption = "R IF Gate :";
 
-template <typename C = Control>
-C makeControl(std::string name, std::string caption, Geometry g = {}) {
-    C c;
-    c.name = std::move(name);
-    c.caption = std::move(caption);
-    c.geometry = g;
-    return c;
-}
-
-CheckBox makeCheckBox(std::string name, std::string caption, Geometry g, Check16 value) {
-    CheckBox c = makeControl<CheckBox>(std::move(name), std::move(caption), g);
-    c.value = value;
-    return c;
-}
-
 std::string rowName(const char* base, int row) {
-    return std::string(base) + "(" + std::to_string(row) + ")";
+    return ControlRegistry::rowName(base, row);
 }
 
 Geometry shiftedDown(Geometry g, int by) {
@@ -46,127 +31,132 @@ Geometry shiftedDown(Geometry g, int by) {
     return g;
 }
 
-}  // namespace
-
-MainForm::MainForm(PulsedModule& state, Bench& bench, Interaction& ui, SolverFactory solverFactory)
-    : state_(state), bench_(bench), ui_(ui), solverFactory_(std::move(solverFactory)) {
-    buildControls();
-}
-
-void MainForm::buildControls() {
-    using namespace layout;
-    f_PulsedZentra = makeControl("f_PulsedZentra", kAppTitle, {0, 0, kWindowWidth, kWindowHeight});
-
-    frm_PulsedParams = makeControl("frm_PulsedParams", "Desired PRF and IFBW", kPulsedParamsFrame);
-    lbl_prf = makeControl("lbl_prf", "Pulse Repetition Frequency :", kPrfLabel);
-    lbl_pri = makeControl("lbl_pri", "Pulse Repetition Interval :", kPriLabel);
-    lbl_ifbw = makeControl("lbl_ifbw", "Receiver IF Bandwidth :", kIfbwLabel);
-    VexoEdit_prf =
-        EntryField("VexoEdit_prf", 5000.0, kPrfRangeHz.low, kPrfRangeHz.high, 3, units::kHertz);
-    VexoEdit_pri = EntryField("VexoEdit_pri", 0.0002, 3.4e-9, 1e18, 3, units::kSeconds);
-    VexoEdit_IFBW =
-        EntryField("VexoEdit_IFBW", 500.0, kIfbwRangeHz.low, kIfbwRangeHz.high, 0, units::kHertz);
-    chk_FixedPRF = makeCheckBox("chk_FixedPRF", "Fixed PRF", kFixedPrfBox, kChecked);
-
-    frm_gates = makeControl("frm_gates", "Modulation/Gates", kGatesFrame);
-    lbl_width = makeControl("lbl_width", "Width", kWidthHeading);
-    lbl_delay = makeControl("lbl_delay", "Delay", kDelayHeading);
-    lbl_gate.clear();
-    VexoEdit_width.clear();
-    VexoEdit_delay.clear();
-    // Room for the sixth row up front, so that growing never moves a field a view is bound to.
-    lbl_gate.reserve(kMaxRows);
-    VexoEdit_width.reserve(kMaxRows);
-    VexoEdit_delay.reserve(kMaxRows);
-    fieldGeometry.clear();
-    for (int row = 0; row < kDesignedRows; ++row) addRow(row);
-
-    frm_DutyCycle = makeControl("frm_DutyCycle", "Duty Cycle", kDutyCycleFrame);
-    lbl_DutyCycle = makeControl("lbl_DutyCycle", "", kDutyCycleLabel);
-    frm_pulsed = makeControl("frm_pulsed", "", kPulsedFrame);
-    b_calculate = makeControl("b_calculate", "Calculate", kCalculateButton);
-    b_apply = makeControl("b_apply", "Apply", kApplyButton);
-    chk_pulsed = makeCheckBox("chk_pulsed", "Pulsed Mode On", kPulsedBox, kChecked);
-
-    const auto button = [](const char* name, const char* caption, int slot) {
-        return makeControl(name, caption,
-                           {kButtonLeft[slot], kButtonTop, kButtonWidth, kButtonHeight});
-    };
-    b_PulseProfile = button("b_PulseProfile", "Pulse Profile", 0);
-    b_recall = button("b_recall", "Recall", 1);
-    b_save = button("b_save", "Save", 2);
-    b_min = button("b_min", "Minimize", 3);
-    b_close = button("b_close", "Close", 4);
-
-    struct MenuRow {
-        MenuEntry MainForm::*entry;
-        const char* name;
-        const char* caption;
-    };
-    static constexpr MenuRow kMenus[] = {
-        {&MainForm::m_Config, "m_Config", "&Configure"},
-        {&MainForm::m_ConfigPG, "m_ConfigPG", "&Pulse Generators/Modulators..."},
-        {&MainForm::m_ConfigRx, "m_ConfigRx", "&Receiver Gains..."},
-        {&MainForm::m_ConverterMeas, "m_ConverterMeas", "&Converter Measurements"},
-        {&MainForm::m_NoPG, "m_NoPG", "No Pulse &Generators"},
-        {&MainForm::m_NoSWGating, "m_NoSWGating", "No &SW Gating"},
-        {&MainForm::m_View, "m_View", "&View"},
-        {&MainForm::m_PulseProfile, "m_PulseProfile", "&Pulse Profile..."},
-        {&MainForm::m_PulseConfig, "m_PulseConfig", "Pulse &Configuration..."},
-        {&MainForm::m_help, "m_help", "&Help"},
-        {&MainForm::m_contents, "m_contents", "&Contents..."},
-        {&MainForm::m_about, "m_about", "&About..."},
-    };
-    for (const MenuRow& m : kMenus) this->*m.entry = makeControl<MenuEntry>(m.name, m.caption);
-
-    fieldGeometry[VexoEdit_prf.name()] = kPrfField;
-    fieldGeometry[VexoEdit_pri.name()] = kPriField;
-    fieldGeometry[VexoEdit_IFBW.name()] = kIfbwField;
-    bindFields();
-}
-
-void MainForm::addRow(int row) {
-    const std::string caption =
-        row < layout::kDesignedRows ? kGateCaptions[row] : std::string(kSixthRowCaption);
-    lbl_gate.push_back(makeControl(rowName("lbl_gate", row), caption, layout::gateLabel(row)));
-    VexoEdit_width.emplace_back(rowName("VexoEdit_width", row), 1e-6, 3.4e-9, 1e18, 3,
-                                units::kSeconds);
-    VexoEdit_delay.emplace_back(rowName("VexoEdit_delay", row), 0.0, 0.0, 1.0, 3, units::kSeconds);
-    fieldGeometry[VexoEdit_width.back().name()] = layout::widthField(row);
-    fieldGeometry[VexoEdit_delay.back().name()] = layout::delayField(row);
-}
-
-void MainForm::bindFields() {
-    VexoEdit_prf.onValueChanged([this] {
-        runPrfRule(VexoEdit_prf.stepProperty() != 1);
-        notifyChanged();
-    });
-    VexoEdit_pri.onValueChanged([this] {
-        priRule();
-        notifyChanged();
-    });
-    VexoEdit_IFBW.onValueChanged([this] {
-        ifbwRule();
-        notifyChanged();
-    });
-    for (int row = 0; row < rowCount(); ++row) {
-        VexoEdit_width[row].onValueChanged([this, row] {
-            widthRule(row);
-            notifyChanged();
-        });
-        VexoEdit_delay[row].onValueChanged([this, row] {
-            delayRule(row);
-            notifyChanged();
-        });
+// Rows are changed in place, never rebuilt: views hold references to them.
+template <typename T>
+void putRow(std::deque<T>& rows, int row, T value) {
+    const auto i = static_cast<std::size_t>(row);
+    if (i < rows.size()) {
+        rows[i] = std::move(value);
+    } else {
+        rows.push_back(std::move(value));
     }
 }
 
-void MainForm::notifyChanged() {
-    for (const auto& listener : listeners_) listener();
+}  // namespace
+
+std::string AnalyzerStatus::text() const {
+    std::string text = model.empty() ? std::string("No analyzer") : model;
+    if (!options.empty()) text += " " + options;
+    if (simulated) text += " (simulated)";
+    return text + (needsCalculation ? " - Calculate needed" : " - Calculated");
+}
+
+MainForm::MainForm(PulsedModule& state, Bench& bench, Interaction& ui, SolverFactory solverFactory)
+    : FormModel(ui), state_(state), bench_(bench), solverFactory_(std::move(solverFactory)) {
+    declareControls();
+}
+
+// One line per control, in the order the window and its JSON show them.
+void MainForm::declareControls() {
+    using namespace layout;
+    ControlRegistry& t = controls_;
+    const ControlRegistry::Handler notYet;  // says "... is not available in this version yet."
+    const MenuStyle checkMark{.checkable = true};
+    t.clear();
+    t.window(f_PulsedZentra, {"f_PulsedZentra", kAppTitle, {0, 0, kWindowWidth, kWindowHeight}});
+
+    const std::string params = "frm_PulsedParams";
+    t.frame(frm_PulsedParams, {params, "Desired PRF and IFBW", kPulsedParamsFrame});
+    t.label(lbl_prf, {"lbl_prf", "Pulse Repetition Frequency :", kPrfLabel}, params);
+    t.entry(VexoEdit_prf,
+            {"VexoEdit_prf", 5000.0, kPrfRangeHz.low, kPrfRangeHz.high, 3, units::kHertz},
+            kPrfField, params, [this] { runPrfRule(VexoEdit_prf.stepProperty() != 1); });
+    t.label(lbl_pri, {"lbl_pri", "Pulse Repetition Interval :", kPriLabel}, params);
+    t.entry(VexoEdit_pri, {"VexoEdit_pri", 0.0002, 3.4e-9, 1e18, 3, units::kSeconds}, kPriField,
+            params, [this] { priRule(); });
+    t.label(lbl_ifbw, {"lbl_ifbw", "Receiver IF Bandwidth :", kIfbwLabel}, params);
+    t.entry(VexoEdit_IFBW,
+            {"VexoEdit_IFBW", 500.0, kIfbwRangeHz.low, kIfbwRangeHz.high, 0, units::kHertz},
+            kIfbwField, params, [this] { ifbwRule(); });
+    t.checkBox(chk_FixedPRF, {"chk_FixedPRF", "Fixed PRF", kFixedPrfBox}, kChecked, params,
+               [this] { chk_FixedPRF_Click(); });
+
+    const std::string gates = "frm_gates";
+    t.frame(frm_gates, {gates, "Modulation/Gates", kGatesFrame});
+    t.label(lbl_width, {"lbl_width", "Width", kWidthHeading}, gates);
+    t.label(lbl_delay, {"lbl_delay", "Delay", kDelayHeading}, gates);
+    setRowCount(kDesignedRows);
+    t.labelRows("lbl_gate", lbl_gate, gates);
+    t.entryRows("VexoEdit_width", VexoEdit_width, gates, [this](int row) { widthRule(row); });
+    t.entryRows("VexoEdit_delay", VexoEdit_delay, gates, [this](int row) { delayRule(row); });
+
+    t.frame(frm_DutyCycle, {"frm_DutyCycle", "Duty Cycle", kDutyCycleFrame});
+    t.label(lbl_DutyCycle, {"lbl_DutyCycle", "", kDutyCycleLabel}, "frm_DutyCycle");
+    t.frame(frm_pulsed, {"frm_pulsed", "", kPulsedFrame});
+    t.button(b_calculate, {"b_calculate", "Calculate", kCalculateButton}, "frm_pulsed",
+             [this] { b_calculate_Click(); });
+    t.button(b_apply, {"b_apply", "Apply", kApplyButton}, "frm_pulsed", notYet);
+    t.checkBox(chk_pulsed, {"chk_pulsed", "Pulsed Mode On", kPulsedBox}, kChecked, "frm_pulsed",
+               [this] { chk_pulsed_Click(); });
+
+    const auto slot = [](int i) {
+        return Geometry{kButtonLeft[i], kButtonTop, kButtonWidth, kButtonHeight};
+    };
+    // Minimize and Close act on the window a view shows; the model has nothing to do for them.
+    const ControlRegistry::Handler byView = [] {};
+    t.button(b_PulseProfile, {"b_PulseProfile", "Pulse Profile", slot(0)}, "", notYet);
+    t.button(b_recall, {"b_recall", "Recall", slot(1)}, "", notYet);
+    t.button(b_save, {"b_save", "Save", slot(2)}, "", notYet);
+    t.button(b_min, {"b_min", "Minimize", slot(3)}, "", byView);
+    t.button(b_close, {"b_close", "Close", slot(4)}, "", byView);
+
+    t.menu(m_Config, {"m_Config", "&Configure"});
+    t.menuEntry(m_ConfigPG, {"m_ConfigPG", "&Pulse Generators/Modulators..."}, "m_Config", notYet);
+    t.menuEntry(m_ConfigRx, {"m_ConfigRx", "&Receiver Gains..."}, "m_Config", notYet);
+    t.menuEntry(m_ConverterMeas, {"m_ConverterMeas", "&Converter Measurements"}, "m_Config",
+                [this] { m_ConverterMeas_Click(); }, {.checkable = true, .separatorBefore = true});
+    t.menuEntry(
+        m_NoPG, {"m_NoPG", "No Pulse &Generators"}, "m_Config", [this] { m_NoPG_Click(); },
+        checkMark);
+    t.menuEntry(
+        m_NoSWGating, {"m_NoSWGating", "No &SW Gating"}, "m_Config",
+        [this] { m_NoSWGating_Click(); }, checkMark);
+    t.menu(m_View, {"m_View", "&View"});
+    t.menuEntry(m_PulseProfile, {"m_PulseProfile", "&Pulse Profile..."}, "m_View", notYet);
+    t.menuEntry(m_PulseConfig, {"m_PulseConfig", "Pulse &Configuration..."}, "m_View", notYet);
+    t.menu(m_help, {"m_help", "&Help"});
+    t.menuEntry(m_contents, {"m_contents", "&Contents..."}, "m_help",
+                [this] { m_contents_Click(); });
+    t.menuEntry(m_about, {"m_about", "&About..."}, "m_help", notYet);
+}
+
+void MainForm::setRowCount(int rows) {
+    for (int row = 0; row < rows; ++row) {
+        Control label;
+        label.name = rowName("lbl_gate", row);
+        label.caption = row < layout::kDesignedRows ? kGateCaptions[row] : kSixthRowCaption;
+        label.geometry = layout::gateLabel(row);
+        putRow(lbl_gate, row, std::move(label));
+        putRow(VexoEdit_width, row,
+               EntryField(rowName("VexoEdit_width", row), 1e-6, 3.4e-9, 1e18, 3, units::kSeconds));
+        putRow(VexoEdit_delay, row,
+               EntryField(rowName("VexoEdit_delay", row), 0.0, 0.0, 1.0, 3, units::kSeconds));
+        controls_.placeField(VexoEdit_width[row].name(), layout::widthField(row));
+        controls_.placeField(VexoEdit_delay[row].name(), layout::delayField(row));
+    }
+    const auto keep = static_cast<std::size_t>(rows);
+    while (lbl_gate.size() > keep) lbl_gate.pop_back();
+    while (VexoEdit_width.size() > keep) VexoEdit_width.pop_back();
+    while (VexoEdit_delay.size() > keep) VexoEdit_delay.pop_back();
 }
 
 int MainForm::ruleRows() const {
     return std::clamp<int>(state_.NumOutputs, 0, rowCount());
+}
+
+AnalyzerStatus MainForm::status() const {
+    return {identity_.modelText, identity_.optionText, bench_.simulated(),
+            isTrue(state_.NeedsCalculation)};
 }
 
 // ---- Start-up.
@@ -174,10 +164,12 @@ int MainForm::ruleRows() const {
 void MainForm::Form_Load() {
     // Everything the analyzer can fail on happens before the state or a control is touched.
     PulsedModule filled = state_;
-    fillAtStartup(filled, readAnalyzerIdentity(bench_));
+    AnalyzerIdentity identity = readAnalyzerIdentity(bench_);
+    fillAtStartup(filled, identity);
     state_ = std::move(filled);
+    identity_ = std::move(identity);
 
-    buildControls();
+    declareControls();
     layOutRows(state_);
     chk_FixedPRF.value = isTrue(state_.FixedPRF) ? kChecked : kUnchecked;
 
@@ -201,9 +193,12 @@ void MainForm::Form_Load() {
 
 void MainForm::layOutRows(const PulsedModule& filled) {
     if (!filled.isFourPort()) return;  // the designed five rows stay as they are
+    // Growing puts every row into its designed state, so the captions come after.
+    if (rowCount() < filled.NumOutputs) {
+        setRowCount(std::min<int>(filled.NumOutputs, kMaxRows));
+        controls_.connectEntries();
+    }
     for (int row = 1; row <= 4; ++row) lbl_gate[row].caption = kFourPortCaptions[row - 1];
-    while (rowCount() < filled.NumOutputs && rowCount() < kMaxRows) addRow(rowCount());
-    bindFields();
 
     const int grow = layout::kRowPitch * (rowCount() - layout::kDesignedRows);
     frm_gates.geometry.height = layout::kGatesFrame.height + grow;
@@ -218,18 +213,10 @@ void MainForm::layOutRows(const PulsedModule& filled) {
 
 void MainForm::chk_FixedPRF_Click() {
     state_.FixedPRF = toBool16(chk_FixedPRF.checked());
-    notifyChanged();
-}
-
-void MainForm::setFixedPRF(bool checked) {
-    chk_FixedPRF.value = checked ? kChecked : kUnchecked;
-    chk_FixedPRF_Click();
 }
 
 // Apply reads the box when it runs; nothing else depends on it.
-void MainForm::chk_pulsed_Click() {
-    notifyChanged();
-}
+void MainForm::chk_pulsed_Click() {}
 
 void MainForm::Invalidate() {
     state_.NeedsCalculation = kTrue;
@@ -241,14 +228,12 @@ void MainForm::Invalidate() {
 void MainForm::m_NoSWGating_Click() {
     m_NoSWGating.checked = !m_NoSWGating.checked;
     Invalidate();
-    notifyChanged();
 }
 
 void MainForm::m_ConverterMeas_Click() {
     m_ConverterMeas.checked = !m_ConverterMeas.checked;
     state_.NeedsCalculation = kTrue;
     if (b_apply.enabled) b_apply.enabled = false;
-    notifyChanged();
 }
 
 void MainForm::m_NoPG_Click() {
@@ -263,18 +248,13 @@ void MainForm::m_NoPG_Click() {
         frm_gates.enabled = true;
     }
     state_.NeedsCalculation = kTrue;
-    notifyChanged();
 }
 
 // ---- Help.
 
 void MainForm::m_contents_Click() {
-    const HelpFileQuery help = queryHelpFile(bench_);
-    if (help.error) {
-        ui_.message(*help.error);
-        return;
-    }
-    ui_.showHelp(help.file, kHelpTopic);
+    HelpFileQuery help = queryHelpFile(bench_);
+    ui_.showHelp({std::move(help.file), kHelpTopic, std::move(help.error)});
 }
 
 }  // namespace zp

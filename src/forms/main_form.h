@@ -1,11 +1,12 @@
 #pragma once
 // The main window "Veltrix Zentra Pulse Application" as a presentation model: every control's
-// state, the start-up sequence, the entry rules, the timing rules and Calculate. Views bind to it
-// and call its handlers; it never touches a widget.
+// state, the start-up sequence, the entry rules, the timing rules and Calculate. Its table of
+// controls (controls()) is what views bind to and what the command line drives; it never touches
+// a widget.
 
 #include <cstdint>
+#include <deque>
 #include <functional>
-#include <map>
 #include <memory>
 #include <string>
 #include <vector>
@@ -13,13 +14,24 @@
 #include "core/entry_field.h"
 #include "core/pulsed_module.h"
 #include "core/timing_solver.h"
+#include "forms/control_registry.h"
 #include "forms/controls.h"
 #include "forms/interaction.h"
 #include "instruments/bench.h"
 
 namespace zp {
 
-class MainForm {
+// What the status line says: the analyzer, whether it is simulated, whether to Calculate.
+struct AnalyzerStatus {
+    std::string model;
+    std::string options;
+    bool simulated = false;
+    bool needsCalculation = true;
+    // e.g. "KT622A K71 M81 (simulated) - Calculate needed"
+    std::string text() const;
+};
+
+class MainForm : public FormModel {
   public:
     using SolverFactory = std::function<std::unique_ptr<TimingSolver>()>;
 
@@ -32,12 +44,13 @@ class MainForm {
     // cannot be reached or answers with an error; the state is then left as it was.
     void Form_Load();
 
-    // ---- Controls, named as in the window. Rows are indexed 0 .. NumOutputs - 1.
+    // ---- Controls, named as in the window. Rows are indexed 0 .. NumOutputs - 1; they sit in
+    // deques so that a view's reference to a row stays good while rows are added.
     Control f_PulsedZentra;  // the window itself: caption and height
     Control frm_gates, lbl_width, lbl_delay;
-    std::vector<Control> lbl_gate;
-    std::vector<EntryField> VexoEdit_width;
-    std::vector<EntryField> VexoEdit_delay;
+    std::deque<Control> lbl_gate;
+    std::deque<EntryField> VexoEdit_width;
+    std::deque<EntryField> VexoEdit_delay;
     Control frm_PulsedParams, lbl_prf, lbl_pri, lbl_ifbw;
     EntryField VexoEdit_prf;
     EntryField VexoEdit_pri;
@@ -52,21 +65,18 @@ class MainForm {
     MenuEntry m_View, m_PulseProfile, m_PulseConfig;
     MenuEntry m_help, m_contents, m_about;
 
-    // Where each entry field sits (twips, relative to its frame), by the field's name.
-    std::map<std::string, Geometry> fieldGeometry;
-
-    // ---- Handlers.
+    // ---- Handlers (the table runs them; views refresh once after each).
     void b_calculate_Click();
     void chk_FixedPRF_Click();
     void chk_pulsed_Click();
     void m_ConverterMeas_Click();
     void m_NoPG_Click();
     void m_NoSWGating_Click();
-    void m_contents_Click();  // help at topic 1114
+    // Help at topic 1114: the analyzer's help file, or our own manual when it names none.
+    void m_contents_Click();
     void Invalidate();
 
-    // Sets a check box from code, running its click rule as a user's click does.
-    void setFixedPRF(bool checked);
+    AnalyzerStatus status() const;
 
     // ---- Timing rules.
     double FMaxPulseWidth() const;
@@ -97,24 +107,20 @@ class MainForm {
     PulsedModule& state() { return state_; }
     const PulsedModule& state() const { return state_; }
     Bench& bench() { return bench_; }
-    Interaction& ui() { return ui_; }
-
-    // Views refresh themselves from the model after every change.
-    void onChanged(std::function<void()> listener) { listeners_.push_back(std::move(listener)); }
-    void notifyChanged();
 
     static constexpr int kHelpTopic = 1114;
 
   private:
-    void buildControls();
-    void addRow(int row);
-    void bindFields();
+    // The designed window: every control in its first state, declared in the table.
+    void declareControls();
+    // Rows 0 .. rows - 1 in their designed state, changed in place; rows beyond go.
+    void setRowCount(int rows);
     void layOutRows(const PulsedModule& filled);
     void runPrfRule(bool fromStep);
     void pullBackDelay(EntryField& delay, double prf);
     // The tail of the width and delay rules: the changed row's value goes to the rows sharing
     // its output, the profile is disabled and the setup invalidated.
-    void shareRowChange(std::vector<EntryField>& column, int row);
+    void shareRowChange(std::deque<EntryField>& column, int row);
     void calculateSolution(double desiredPrf);
     void showResults(double desiredPrf);
     // Rows the timing rules look at: NumOutputs, never more than the window has.
@@ -122,9 +128,8 @@ class MainForm {
 
     PulsedModule& state_;
     Bench& bench_;
-    Interaction& ui_;
     SolverFactory solverFactory_;
-    std::vector<std::function<void()>> listeners_;
+    AnalyzerIdentity identity_;
 };
 
 }  // namespace zp

@@ -3,6 +3,7 @@
 #include <string_view>
 #include <variant>
 
+#include "forms/form_json.h"
 #include "forms/json_writer.h"
 #include "forms/main_form.h"
 
@@ -15,61 +16,6 @@ template <typename T>
 void member(JsonWriter& w, std::string_view name, const T& v) {
     w.key(name);
     w.value(v);
-}
-
-void geometry(JsonWriter& w, const Geometry& g) {
-    member(w, "left", g.left);
-    member(w, "top", g.top);
-    member(w, "width", g.width);
-    member(w, "height", g.height);
-}
-
-// The members every control shares, then its own ones, then where it sits.
-template <typename Extra>
-void controlObject(JsonWriter& w, const Control& c, Extra extra, bool withGeometry = true) {
-    w.key(c.name);
-    w.beginObject();
-    member(w, "caption", c.caption);
-    extra();
-    member(w, "enabled", c.enabled);
-    member(w, "visible", c.visible);
-    if (withGeometry) geometry(w, c.geometry);
-    w.endObject();
-}
-
-void control(JsonWriter& w, const Control& c) {
-    controlObject(w, c, [] {});
-}
-
-void checkBox(JsonWriter& w, const CheckBox& c) {
-    controlObject(w, c, [&] { member(w, "value", static_cast<int>(c.value)); });
-}
-
-void menu(JsonWriter& w, const MenuEntry& m) {
-    controlObject(
-        w, m, [&] { member(w, "checked", m.checked); }, false);
-}
-
-void fieldBody(JsonWriter& w, const EntryField& f) {
-    w.beginObject();
-    member(w, "value", f.value());
-    member(w, "enabled", f.enabled());
-    member(w, "text", f.displayText());
-    member(w, "lower", f.lower());
-    member(w, "upper", f.upper());
-    w.endObject();
-}
-
-void field(JsonWriter& w, const EntryField& f) {
-    w.key(f.name());
-    fieldBody(w, f);
-}
-
-void rowFields(JsonWriter& w, const char* name, const std::vector<EntryField>& rows) {
-    w.key(name);
-    w.beginArray();
-    for (const EntryField& f : rows) fieldBody(w, f);
-    w.endArray();
 }
 
 void flag(JsonWriter& w, const char* name, Bool16 v) {
@@ -181,46 +127,16 @@ void state(JsonWriter& w, const PulsedModule& s) {
 std::string mainFormJson(const MainForm& f) {
     JsonWriter w;
     w.beginObject();
-    w.key(f.f_PulsedZentra.name);
+    writeControls(w, f.controls());
+    const AnalyzerStatus s = f.status();
+    w.key("status");
     w.beginObject();
-    member(w, "caption", f.f_PulsedZentra.caption);
-    member(w, "width", f.f_PulsedZentra.geometry.width);
-    member(w, "height", f.f_PulsedZentra.geometry.height);
+    member(w, "model", s.model);
+    member(w, "options", s.options);
+    member(w, "simulated", s.simulated);
+    member(w, "needsCalculation", s.needsCalculation);
+    member(w, "text", s.text());
     w.endObject();
-
-    control(w, f.frm_PulsedParams);
-    control(w, f.lbl_prf);
-    field(w, f.VexoEdit_prf);
-    control(w, f.lbl_pri);
-    field(w, f.VexoEdit_pri);
-    control(w, f.lbl_ifbw);
-    field(w, f.VexoEdit_IFBW);
-    checkBox(w, f.chk_FixedPRF);
-
-    control(w, f.frm_gates);
-    control(w, f.lbl_width);
-    control(w, f.lbl_delay);
-    w.key("lbl_gate");
-    w.beginArray();
-    for (const Control& label : f.lbl_gate) w.value(label.caption);
-    w.endArray();
-    rowFields(w, "VexoEdit_width", f.VexoEdit_width);
-    rowFields(w, "VexoEdit_delay", f.VexoEdit_delay);
-
-    control(w, f.frm_DutyCycle);
-    control(w, f.lbl_DutyCycle);
-    control(w, f.frm_pulsed);
-    control(w, f.b_calculate);
-    control(w, f.b_apply);
-    checkBox(w, f.chk_pulsed);
-    for (const Control* b : {&f.b_PulseProfile, &f.b_recall, &f.b_save, &f.b_min, &f.b_close})
-        control(w, *b);
-
-    for (const MenuEntry* m :
-         {&f.m_Config, &f.m_ConfigPG, &f.m_ConfigRx, &f.m_ConverterMeas, &f.m_NoPG, &f.m_NoSWGating,
-          &f.m_View, &f.m_PulseProfile, &f.m_PulseConfig, &f.m_help, &f.m_contents, &f.m_about})
-        menu(w, *m);
-
     state(w, f.state());
     w.endObject();
     return w.text() + "\n";

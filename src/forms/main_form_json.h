@@ -1,6 +1,7 @@
 #pragma once
-// The main window's state as one JSON object keyed by control name, with the pulse setup state
-// under "state". The command-line front end prints it for its `show` action.
+// The main window's state as one JSON object keyed by control name, with what the status line says
+// under "status" and the pulse setup state under "state". The command-line front end prints it for
+// its `show` action.
 
 #include <string>
 

@@ -141,7 +141,7 @@ void MainForm::delayRule(int row) {
     shareRowChange(VexoEdit_delay, row);
 }
 
-void MainForm::shareRowChange(std::vector<EntryField>& column, int row) {
+void MainForm::shareRowChange(std::deque<EntryField>& column, int row) {
     const double value = column[row].value();
     // With external generators a row already holding the value is left alone.
     const bool external = state_.UseInternalPG == kUnchecked;

@@ -24,7 +24,7 @@ constexpr double kClock60MHz = 60000000.0;
 // The value of rows [first, end) that `better` prefers. The first row counts even when its field
 // is disabled; later rows only when enabled.
 template <typename Better>
-double extremeOfRows(const std::vector<EntryField>& rows, int first, int end, Better better) {
+double extremeOfRows(const std::deque<EntryField>& rows, int first, int end, Better better) {
     double best = rows.at(first).value();
     for (int row = first + 1; row < end; ++row) {
         const EntryField& f = rows[row];
@@ -55,7 +55,7 @@ double MainForm::FHighestGateDelay() const {
 
 bool MainForm::FPulseWidthOK(double prf) {
     if (FMaxPulseWidth() < 0.9 * (1.0 / prf)) return true;
-    ui_.message(kWidthLimitMessage);
+    ui_.message(kWidthLimitMessage, MessageKind::Warning);
     return false;
 }
 
@@ -81,13 +81,10 @@ void MainForm::SUpdateDutyCycle() {
 // ---- Calculate.
 
 void MainForm::b_calculate_Click() {
-    {
-        BusyPointer busy(ui_);
-        const double desired = VexoEdit_prf.value();
-        if (FPulseWidthOK(desired) && isTrue(state_.NeedsCalculation)) calculateSolution(desired);
-        if (state_.PRF != 0.0) SUpdateDutyCycle();
-    }
-    notifyChanged();
+    BusyPointer busy(ui_);
+    const double desired = VexoEdit_prf.value();
+    if (FPulseWidthOK(desired) && isTrue(state_.NeedsCalculation)) calculateSolution(desired);
+    if (state_.PRF != 0.0) SUpdateDutyCycle();
 }
 
 void MainForm::calculateSolution(double desiredPrf) {
@@ -155,14 +152,14 @@ void MainForm::calculateSolution(double desiredPrf) {
             s.ConverterDelay = solution.converterDelay;
         }
     } catch (const std::exception& e) {
-        ui_.message(e.what());
+        ui_.message(e.what(), MessageKind::Warning);
         return;
     } catch (...) {
-        ui_.message("The timing solver failed.");
+        ui_.message("The timing solver failed.", MessageKind::Warning);
         return;
     }
     if (s.PRF == 0.0)
-        ui_.message(kNoSolutionMessage);
+        ui_.message(kNoSolutionMessage, MessageKind::Warning);
     else
         showResults(desiredPrf);
 }

@@ -24,6 +24,8 @@ class Bench {
     virtual IoTrace* trace() = 0;
     // One line for the user: which analyzer and which generator transport are in use.
     virtual std::string describe() const = 0;
+    // True when the analyzer is a simulation (the window says so).
+    virtual bool simulated() const = 0;
 };
 
 }  // namespace zp

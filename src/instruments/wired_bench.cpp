@@ -32,4 +32,8 @@ std::string WiredBench::describe() const {
     return wired(analyzer_).describe() + ", " + wired(bus_).describe();
 }
 
+bool WiredBench::simulated() const {
+    return wired(analyzer_).simulated();
+}
+
 }  // namespace zp

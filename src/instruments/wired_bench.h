@@ -17,6 +17,7 @@ class AnalyzerSource {
     virtual ~AnalyzerSource() = default;
     virtual std::unique_ptr<AnalyzerApplication> connectAnalyzer() = 0;
     virtual std::string describe() const = 0;  // "simulated KT622A (kt622)"
+    virtual bool simulated() const = 0;
 };
 
 class BusSource {
@@ -37,6 +38,7 @@ class WiredBench : public Bench {
     IoTrace* trace() override { return &trace_; }
     // "<analyzer source>, <bus source>".
     std::string describe() const override;
+    bool simulated() const override;  // the analyzer source's
 
   private:
     IoTrace trace_;

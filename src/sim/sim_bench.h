@@ -30,6 +30,7 @@ class SimInstruments : public AnalyzerSource {
 
     std::unique_ptr<AnalyzerApplication> connectAnalyzer() override;
     std::string describe() const override;
+    bool simulated() const override { return true; }
 
     // Buses to the simulated generators; these instruments must outlive the source.
     std::unique_ptr<BusSource> generatorBus();

@@ -3,6 +3,7 @@
 #include <QDialogButtonBox>
 #include <QDir>
 #include <QFileInfo>
+#include <QLabel>
 #include <QPushButton>
 #include <QTextBrowser>
 #include <QUrl>
@@ -29,9 +30,26 @@ HelpFileCheck checkHelpFile(const QString& file, const QStringList& manualFolder
             QObject::tr("The help file \"%1\" is not part of the Zentra Pulse manual.").arg(file)};
 }
 
-HelpViewer::HelpViewer(QWidget* parent) : QDialog(parent), browser_(new QTextBrowser(this)) {
+HelpFileCheck ownManual(const QStringList& manualFolders) {
+    for (const QString& folder : manualFolders) {
+        const HelpFileCheck check = checkHelpFile(
+            QDir(folder).filePath(QStringLiteral("zentra-pulse.html")), manualFolders);
+        if (check.ok()) return check;
+    }
+    return {{},
+            QObject::tr("The Zentra Pulse manual was not found in %1.")
+                .arg(manualFolders.isEmpty() ? QObject::tr("any folder")
+                                             : manualFolders.join(QStringLiteral(", ")))};
+}
+
+HelpViewer::HelpViewer(QWidget* parent)
+    : QDialog(parent), note_(new QLabel(this)), browser_(new QTextBrowser(this)) {
     setObjectName(QStringLiteral("HelpViewer"));
     setWindowTitle(QString::fromUtf8(kAppTitle) + tr(" - Help"));
+    note_->setObjectName(QStringLiteral("HelpNote"));
+    note_->setTextFormat(Qt::PlainText);
+    note_->setWordWrap(true);
+    note_->hide();
     browser_->setObjectName(QStringLiteral("HelpBrowser"));
     // Links to the web open outside; the manual's own pages stay inside the viewer.
     browser_->setOpenExternalLinks(true);
@@ -42,12 +60,15 @@ HelpViewer::HelpViewer(QWidget* parent) : QDialog(parent), browser_(new QTextBro
     connect(browser_, &QTextBrowser::backwardAvailable, back, &QPushButton::setEnabled);
     back->setEnabled(false);
     auto* layout = new QVBoxLayout(this);
+    layout->addWidget(note_);
     layout->addWidget(browser_);
     layout->addWidget(buttons);
     resize(760, 560);
 }
 
-void HelpViewer::showTopic(const QString& path, int topic) {
+void HelpViewer::showTopic(const QString& path, int topic, const QString& note) {
+    note_->setText(note);
+    note_->setVisible(!note.isEmpty());
     QUrl url = QUrl::fromLocalFile(path);
     url.setFragment(anchorFor(topic));
     browser_->setSearchPaths({QFileInfo(path).absolutePath()});

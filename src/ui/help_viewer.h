@@ -6,6 +6,7 @@
 #include <QString>
 #include <QStringList>
 
+class QLabel;
 class QTextBrowser;
 
 namespace zp::ui {
@@ -20,18 +21,24 @@ struct HelpFileCheck {
 // ".." and links cannot lead out of them).
 HelpFileCheck checkHelpFile(const QString& file, const QStringList& manualFolders);
 
+// The program's own manual: zentra-pulse.html in the first manual folder that has it.
+HelpFileCheck ownManual(const QStringList& manualFolders);
+
 class HelpViewer : public QDialog {
     Q_OBJECT
   public:
     explicit HelpViewer(QWidget* parent = nullptr);
 
-    // Shows `path` (already checked) at the anchor "topic-<topic>".
-    void showTopic(const QString& path, int topic);
+    // Shows `path` (already checked) at the anchor "topic-<topic>"; `note` (one line, may be
+    // empty) says above it why this manual is shown.
+    void showTopic(const QString& path, int topic, const QString& note = {});
 
     QTextBrowser* browser() const { return browser_; }
+    QLabel* note() const { return note_; }
     static QString anchorFor(int topic) { return QStringLiteral("topic-%1").arg(topic); }
 
   private:
+    QLabel* note_;
     QTextBrowser* browser_;
 };
 

@@ -2,27 +2,30 @@
 
 #include <QFocusEvent>
 #include <QKeyEvent>
-#include <QStyle>
+#include <QTimer>
 #include <QToolTip>
 #include <QWheelEvent>
 
 namespace zp::ui {
 
-NumericEntry::NumericEntry(EntryField& field, QWidget* parent) : QLineEdit(parent), field_(&field) {
+NumericEntry::NumericEntry(const EntryField& field, Sink sink, QWidget* parent)
+    : QLineEdit(parent), field_(&field), sink_(std::move(sink)) {
     setObjectName(QString::fromStdString(field.name()));
     setAlignment(Qt::AlignRight | Qt::AlignVCenter);
     refresh();
 }
 
-void NumericEntry::bind(EntryField& field) {
-    field_ = &field;
-    setObjectName(QString::fromStdString(field.name()));
-    refresh();
+void NumericEntry::unbind() {
+    field_ = nullptr;
+    sink_ = nullptr;
+    setModified(false);
 }
 
 void NumericEntry::refresh() {
-    clearError();
+    if (field_ == nullptr) return;
     setEnabled(field_->enabled());
+    if (holdsRefusedText_) return;
+    clearError();
     const QString text = QString::fromStdString(field_->displayText());
     if (QLineEdit::text() != text) setText(text);
     setModified(false);
@@ -32,26 +35,38 @@ void NumericEntry::refresh() {
 }
 
 bool NumericEntry::commit() {
-    if (!isModified()) return true;
-    return accept(field_->enterText(text().toStdString()));
+    if (!isModified() || !sink_) return true;
+    return accept(sink_({text().toStdString(), 0}), false);
+}
+
+bool NumericEntry::commitOnLeave() {
+    if (!isModified() || !sink_) return true;
+    if (accept(sink_({text().toStdString(), 0}), true)) return true;
+    // Taken back once the focus change that got here is over.
+    QTimer::singleShot(0, this, [this] { setFocus(Qt::OtherFocusReason); });
+    return false;
 }
 
 bool NumericEntry::stepBy(int direction) {
+    if (!sink_) return false;
     if (isModified() && !commit()) return false;
-    return accept(field_->step(direction));
+    return accept(sink_({std::nullopt, direction}), false);
 }
 
-bool NumericEntry::accept(const std::optional<std::string>& refusal) {
+bool NumericEntry::accept(const std::optional<std::string>& refusal, bool keepText) {
     if (refusal) {
         const QString reason = QString::fromStdString(*refusal);
-        // The old value comes back; the reason stays visible until the next entry.
-        setText(QString::fromStdString(field_->displayText()));
-        setModified(false);
+        holdsRefusedText_ = keepText;
+        if (!keepText && field_ != nullptr) {
+            setText(QString::fromStdString(field_->displayText()));
+            setModified(false);
+        }
+        // The reason stays visible until the next entry.
         showError(reason);
         emit refused(reason);
         return false;
     }
-    // The field's rules may already have refreshed this widget through the model.
+    holdsRefusedText_ = false;
     refresh();
     emit entered();
     return true;
@@ -87,6 +102,7 @@ void NumericEntry::keyPressEvent(QKeyEvent* event) {
             return;
         case Qt::Key_Escape:
             if (isModified()) {
+                holdsRefusedText_ = false;
                 refresh();
                 return;
             }
@@ -98,7 +114,8 @@ void NumericEntry::keyPressEvent(QKeyEvent* event) {
 }
 
 void NumericEntry::wheelEvent(QWheelEvent* event) {
-    if (!isEnabled()) {
+    // Scrolling past the form must not change a value: only the box being edited steps.
+    if (!isEnabled() || !hasFocus()) {
         event->ignore();
         return;
     }
@@ -117,7 +134,7 @@ void NumericEntry::wheelEvent(QWheelEvent* event) {
 
 void NumericEntry::focusOutEvent(QFocusEvent* event) {
     // A popup (e.g. the context menu) takes the focus without ending the entry.
-    if (event->reason() != Qt::PopupFocusReason) commit();
+    if (event->reason() != Qt::PopupFocusReason) commitOnLeave();
     QLineEdit::focusOutEvent(event);
 }
 

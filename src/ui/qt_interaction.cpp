@@ -49,8 +49,9 @@ QtInteraction::~QtInteraction() {
     if (pointer_ != Pointer::Normal) QApplication::restoreOverrideCursor();
 }
 
-void QtInteraction::message(const std::string& text) {
+void QtInteraction::message(const std::string& text, MessageKind kind) {
     lastMessage_ = QString::fromStdString(text);
+    lastKind_ = kind;
     if (unattended_) {
         std::cerr << "zentra-pulse: message: " << text << std::endl;
         return;
@@ -58,7 +59,8 @@ void QtInteraction::message(const std::string& text) {
     // The person must be able to read it: the busy pointer gives way while the box is up.
     const Pointer saved = pointer_;
     setPointer(Pointer::Normal);
-    showBox(window_, QMessageBox::Information, lastMessage_, QMessageBox::Ok);
+    showBox(window_, kind == MessageKind::Warning ? QMessageBox::Warning : QMessageBox::Information,
+            lastMessage_, QMessageBox::Ok);
     setPointer(saved);
 }
 
@@ -112,14 +114,28 @@ void QtInteraction::setPointer(Pointer p) {
     pointer_ = p;
 }
 
-bool QtInteraction::showHelp(const std::string& file, int topic) {
-    const HelpFileCheck check = checkHelpFile(QString::fromStdString(file), manualFolders_);
-    if (!check.ok()) {
-        message(check.error.toStdString());
-        return false;
+bool QtInteraction::showHelp(const HelpRequest& request) {
+    // When the manual is ours, one line above it says why the analyzer's is not shown.
+    QString reason;
+    HelpFileCheck check;
+    if (request.analyzerError) {
+        reason = QObject::tr("The analyzer named no help file (%1).")
+                     .arg(QString::fromStdString(*request.analyzerError).simplified());
+    } else {
+        check = checkHelpFile(QString::fromStdString(request.file), manualFolders_);
+        reason = check.error;
+    }
+    QString note;
+    if (!reason.isEmpty()) {
+        check = ownManual(manualFolders_);
+        if (!check.ok()) {
+            message((reason + QLatin1Char(' ') + check.error).toStdString(), MessageKind::Warning);
+            return false;
+        }
+        note = reason + QObject::tr(" This is the Zentra Pulse manual.");
     }
     if (!helpViewer_) helpViewer_ = std::make_unique<HelpViewer>(nullptr);
-    helpViewer_->showTopic(check.path, topic);
+    helpViewer_->showTopic(check.path, request.topic, note);
     helpViewer_->show();
     helpViewer_->raise();
     helpViewer_->activateWindow();

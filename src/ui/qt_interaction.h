@@ -28,16 +28,19 @@ class QtInteraction : public Interaction {
     // answered no and file choices cancelled, so nothing waits for a click.
     void setUnattended(bool on) { unattended_ = on; }
 
-    void message(const std::string& text) override;
+    void message(const std::string& text, MessageKind kind) override;
     bool ask(const std::string& text) override;
     std::optional<std::string> chooseOpenFile(const std::string& filter) override;
     std::optional<std::string> chooseSaveFile(const std::string& filter) override;
     void processEvents() override;
     void setPointer(Pointer p) override;
-    bool showHelp(const std::string& file, int topic) override;
+    // The analyzer's help file; our own manual, with a note saying why, when the analyzer named
+    // none or a file that cannot be shown.
+    bool showHelp(const HelpRequest& request) override;
 
     Pointer pointer() const { return pointer_; }
     const QString& lastMessage() const { return lastMessage_; }
+    MessageKind lastMessageKind() const { return lastKind_; }
     HelpViewer* helpViewer() const { return helpViewer_.get(); }
 
   private:
@@ -49,6 +52,7 @@ class QtInteraction : public Interaction {
     bool unattended_ = false;
     Pointer pointer_ = Pointer::Normal;
     QString lastMessage_;
+    MessageKind lastKind_ = MessageKind::Information;
     std::unique_ptr<HelpViewer> helpViewer_;
 };
 

@@ -1,6 +1,8 @@
 #include "ui/single_instance.h"
 
 #include <QDir>
+#include <QGuiApplication>
+#include <QHash>
 #include <QLocalServer>
 #include <QLocalSocket>
 #include <QRegularExpression>
@@ -18,9 +20,19 @@ QString SingleInstance::defaultKey() {
     QString user = qEnvironmentVariable("USER");
     if (user.isEmpty()) user = qEnvironmentVariable("USERNAME");
     if (user.isEmpty()) user = QDir::home().dirName();
+    // One instance per display: a start on another display opens a window there. The platform's
+    // own display variable counts first (an X program on Wayland has both).
+    const QString platform = QGuiApplication::platformName();
+    const bool wayland = platform.startsWith(QStringLiteral("wayland"));
+    QString display = qEnvironmentVariable(wayland ? "WAYLAND_DISPLAY" : "DISPLAY");
+    if (display.isEmpty()) display = qEnvironmentVariable(wayland ? "DISPLAY" : "WAYLAND_DISPLAY");
+    // A display given as a long socket path would not fit into a socket name.
+    if (display.size() > 32) display = QString::number(qHash(display), 16);
+    QString key = QStringLiteral("zentra-pulse-%1-%2").arg(user, platform);
+    if (!display.isEmpty()) key += QLatin1Char('-') + display;
     // The key becomes a file name: keep it to harmless characters.
-    user.replace(QRegularExpression(QStringLiteral("[^A-Za-z0-9_.-]")), QStringLiteral("_"));
-    return QStringLiteral("zentra-pulse-") + user;
+    key.replace(QRegularExpression(QStringLiteral("[^A-Za-z0-9_.-]")), QStringLiteral("_"));
+    return key;
 }
 
 SingleInstance::Role SingleInstance::start() {

@@ -1,7 +1,7 @@
 #pragma once
-// One running program per user: the first start listens on a local socket named after the user,
-// a second start tells it to come to the front and ends. The socket file goes when this object
-// does; one left by a crashed run is taken over.
+// One running program per user and display: the first start listens on a local socket named
+// after both, a second start tells it to come to the front and ends. The socket file goes when this
+// object does; one left by a crashed run is taken over.
 
 #include <QObject>
 #include <QString>
@@ -25,7 +25,9 @@ class SingleInstance : public QObject {
     // True once start() made this the instance a second start hands over to.
     bool listening() const;
 
-    // "zentra-pulse-<user>"; ZP_INSTANCE_KEY replaces it (tests run side by side).
+    // "zentra-pulse-<user>-<platform>[-<display>]", the display from $DISPLAY or
+    // $WAYLAND_DISPLAY; ZP_INSTANCE_KEY replaces it (tests run side by side). Needs the
+    // application object.
     static QString defaultKey();
 
     static constexpr const char* kRaiseMessage = "raise\n";

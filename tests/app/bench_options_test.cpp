@@ -135,12 +135,37 @@ TEST(BenchOptions, TheActionHelpComesFromTheActionTable) {
               "  help                        print the help file the analyzer reports\n"
               "\nExit status: 0 success, 1 failure, 2 bad command line.\n");
     // A usage too long for the column has its help below it.
-    EXPECT_NE(actions.find("\n  set FIELD [ROW] VALUE | set TOGGLE on|off\n" +
-                           std::string(30, ' ') + "type VALUE"),
+    const std::string indent(30, ' ');
+    EXPECT_NE(actions.find("\n  set FIELD [ROW] VALUE | set TOGGLE on|off\n" + indent +
+                           "type VALUE into a field, or set a toggle\n" + indent +
+                           "FIELD: prf|pri|ifbw|width ROW|delay ROW\n" + indent +
+                           "TOGGLE: fixedprf|converter|nopg|noswgating|pulsed\n" + indent +
+                           "VALUE: a number with a unit, e.g. 10k, 200us\n  step"),
               std::string::npos)
         << actions;
     for (const ActionKind& kind : actionTable()) {
         EXPECT_NE(actions.find("\n  " + kind.usage), std::string::npos) << kind.name;
+    }
+}
+
+TEST(BenchOptions, HelpListsEveryOptionOfItsProgram) {
+    const std::pair<const char*, std::vector<std::string>> options[] = {
+        {"--analyzer", {"--analyzer", "sim:kt622"}},
+        {"--list-models", {"--list-models"}},
+        {"--bus", {"--bus", "sim"}},
+        {"--trace-io", {"--trace-io", "t.log"}},
+        {"--fault", {"--fault", "baddata"}},
+        {"--help", {"--help"}},
+        {"--version", {"--version"}},
+        {"--yes", {"--yes"}},
+        {"--screenshot", {"--screenshot", "w.png"}}};
+    for (const Program program : {Program::Gui, Program::Cli}) {
+        const std::string usage = usageText(program);
+        for (const auto& [option, args] : options) {
+            const bool accepted = parseCommandLine(args, program).error.empty();
+            EXPECT_EQ(usage.find(std::string("  ") + option) != std::string::npos, accepted)
+                << programName(program) << " " << option;
+        }
     }
 }
 

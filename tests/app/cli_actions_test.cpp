@@ -83,9 +83,15 @@ TEST_F(CliActions, TheFirstFailureEndsTheRunWithItsReason) {
 
     form_->m_NoSWGating.enabled = false;  // as on an analyzer without a known layout
     EXPECT_EQ(run({"set", "noswgating", "on"}), 1);
-    EXPECT_NE(err_.str().find("No SW Gating is not available on this analyzer"), std::string::npos)
-        << err_.str();
+    EXPECT_EQ(err_.str(), "zentra-pulse-cli: set noswgating on: No SW Gating is disabled\n");
     EXPECT_FALSE(form_->m_NoSWGating.checked);
+
+    // Without pulse generators the gate lines cannot be typed into, as in the window.
+    EXPECT_EQ(run({"set", "nopg", "on", "set", "width", "1", "2us"}), 1);
+    EXPECT_EQ(err_.str(),
+              "zentra-pulse-cli: set width 1 2us: VexoEdit_width(1) is disabled "
+              "(Modulation/Gates is disabled)\n");
+    EXPECT_EQ(form_->VexoEdit_width[1].value(), 1e-6);
 }
 
 TEST_F(CliActions, CalculateSolvesAndAMessageDuringAnActionIsAFailure) {
@@ -120,6 +126,9 @@ TEST_F(CliActions, StepHelpAndShow) {
 
     ASSERT_EQ(run({"show"}), 0);
     EXPECT_EQ(out_.str().rfind("{\n \"f_PulsedZentra\": ", 0), 0u) << "the JSON only";
+    EXPECT_NE(out_.str().find("\n \"status\": {\"model\": \"KT622A\", \"options\": \"K71 M81\", "
+                              "\"simulated\": true, "),
+              std::string::npos);
 }
 
 TEST_F(CliActions, AFailureIsOneLineWhateverTheAnalyzerSaid) {
@@ -151,7 +160,7 @@ TEST_F(CliActions, ParseErrorsNameTheWordAndWhatWasExpected) {
 TEST(ConsoleInteraction, PrintsMessagesOnOneLineAndAnswersAsTold) {
     std::ostringstream out;
     ConsoleInteraction no(out, false);
-    no.message("No solution found.\r\nFor more information, see the help.");
+    no.message("No solution found.\r\nFor more information, see the help.", MessageKind::Warning);
     EXPECT_FALSE(no.ask("Overwrite?"));
     EXPECT_EQ(out.str(),
               "message: No solution found. For more information, see the help.\n"

@@ -140,11 +140,34 @@ TEST(GuiProgram, SecondStartHandsOverToTheRunningOneAndEnds) {
     EXPECT_EQ(second.status, 0) << second.err;
     EXPECT_LT(std::chrono::steady_clock::now() - started, 5s);
     EXPECT_EQ(second.err.find(kListening), std::string::npos) << second.err;
+    EXPECT_NE(
+        second.err.find("zentra-pulse: already running on this display; brought it to the front\n"),
+        std::string::npos)
+        << second.err;
     EXPECT_TRUE(first.waitForErr("zentra-pulse: raised by a second start", 10s)) << first.err();
     EXPECT_TRUE(first.running());
     // SIGTERM closes it cleanly, and its socket file goes with it.
     EXPECT_EQ(first.stop(), 0) << first.err();
     EXPECT_FALSE(fs::exists(instanceSocket(key)));
+}
+
+TEST(GuiProgram, AStartOnAnotherDisplayOpensAWindowThere) {
+    if (!haveGui()) GTEST_SKIP() << "built without the window program";
+    // The per-user key, not a test key: the display is what tells the two apart.
+    const std::string display = ":" + uniqueKey();
+    const auto onDisplay = [&](const std::string& suffix) {
+        return Env{{"QT_QPA_PLATFORM", "offscreen"},
+                   {"ZP_INSTANCE_KEY", ""},
+                   {"WAYLAND_DISPLAY", ""},
+                   {"DISPLAY", display + suffix}};
+    };
+    RunningProgram first(kGui, {}, onDisplay("a"));
+    ASSERT_TRUE(first.waitForErr(kListening, 20s)) << first.err();
+    RunningProgram second(kGui, {}, onDisplay("b"));
+    EXPECT_TRUE(second.waitForErr(kListening, 20s)) << second.err();
+    EXPECT_EQ(second.stop(), 0);
+    EXPECT_EQ(first.err().find("raised by a second start"), std::string::npos) << first.err();
+    EXPECT_EQ(first.stop(), 0);
 }
 
 TEST(GuiProgram, ASocketFileLeftByACrashedRunDoesNotBlockANewStart) {

@@ -29,20 +29,157 @@ TEST(UnitList, ParsesPairsAndRefusesMalformedLists) {
     EXPECT_THROW(EntryField("f", 0, 2, 1, 0, units::kPlain), std::invalid_argument);
 }
 
-TEST(EntryFieldParse, NumbersWithUnitsAndMultiplierLetters) {
+// Every spelling of every unit list: exact SI names first (letters keep their case), then the
+// SCPI reading ignoring case, where "M" is milli except in MHZ and MOHM. 0 = unknown unit.
+TEST(EntryFieldParse, UnitSpellingTable) {
+    struct Case {
+        const char* list;
+        const char* spelling;
+        double factor;
+    };
+    const Case cases[] = {
+        // Seconds.
+        {units::kSeconds, "", 1},
+        {units::kSeconds, "sec", 1},
+        {units::kSeconds, "s", 1},
+        {units::kSeconds, "msec", 1e-3},
+        {units::kSeconds, "ms", 1e-3},
+        {units::kSeconds, "usec", 1e-6},
+        {units::kSeconds, "us", 1e-6},
+        {units::kSeconds, "\xC2\xB5s", 1e-6},
+        {units::kSeconds, "\xCE\xBCsec", 1e-6},
+        {units::kSeconds, "nsec", 1e-9},
+        {units::kSeconds, "ns", 1e-9},
+        {units::kSeconds, "psec", 1e-12},
+        {units::kSeconds, "ps", 1e-12},
+        {units::kSeconds, "p", 1e-12},
+        {units::kSeconds, "n", 1e-9},
+        {units::kSeconds, "u", 1e-6},
+        {units::kSeconds, "m", 1e-3},
+        {units::kSeconds, "k", 1e3},
+        {units::kSeconds, "M", 1e6},
+        {units::kSeconds, "G", 1e9},
+        {units::kSeconds, "ks", 1e3},
+        {units::kSeconds, "Ms", 1e6},
+        {units::kSeconds, "Msec", 1e6},
+        {units::kSeconds, "Gsec", 1e9},
+        {units::kSeconds, "S", 1},
+        {units::kSeconds, "SEC", 1},
+        {units::kSeconds, "MS", 1e-3},
+        {units::kSeconds, "MSEC", 1e-3},
+        {units::kSeconds, "mSec", 1e-3},
+        {units::kSeconds, "US", 1e-6},
+        {units::kSeconds, "NS", 1e-9},
+        {units::kSeconds, "PS", 1e-12},
+        {units::kSeconds, "K", 1e3},
+        {units::kSeconds, "KS", 1e3},
+        {units::kSeconds, "g", 1e9},
+        {units::kSeconds, "U", 1e-6},
+        {units::kSeconds, "Hz", 0},
+        {units::kSeconds, "mm", 0},
+        {units::kSeconds, "secs", 0},
+        {units::kSeconds, "m s", 0},
+        {units::kSeconds, ".", 0},
+        {units::kSeconds, "x", 0},
+        // Hertz.
+        {units::kHertz, "Hz", 1},
+        {units::kHertz, "kHz", 1e3},
+        {units::kHertz, "MHz", 1e6},
+        {units::kHertz, "GHz", 1e9},
+        {units::kHertz, "mHz", 1e-3},
+        {units::kHertz, "uHz", 1e-6},
+        {units::kHertz, "m", 1e-3},
+        {units::kHertz, "M", 1e6},
+        {units::kHertz, "k", 1e3},
+        {units::kHertz, "HZ", 1},
+        {units::kHertz, "hz", 1},
+        {units::kHertz, "KHZ", 1e3},
+        {units::kHertz, "khz", 1e3},
+        {units::kHertz, "MHZ", 1e6},
+        {units::kHertz, "mhz", 1e6},
+        {units::kHertz, "mHZ", 1e6},
+        {units::kHertz, "GHZ", 1e9},
+        {units::kHertz, "UHZ", 1e-6},
+        {units::kHertz, "K", 1e3},
+        {units::kHertz, "s", 0},
+        {units::kHertz, "ms", 0},
+        {units::kHertz, "Hzz", 0},
+        {units::kHertz, "kk", 0},
+        // Volts.
+        {units::kVolts, "V", 1},
+        {units::kVolts, "mV", 1e-3},
+        {units::kVolts, "kV", 1e3},
+        {units::kVolts, "MV", 1e6},
+        {units::kVolts, "uV", 1e-6},
+        {units::kVolts, "m", 1e-3},
+        {units::kVolts, "v", 1},
+        {units::kVolts, "mv", 1e-3},
+        {units::kVolts, "Mv", 1e-3},
+        {units::kVolts, "KV", 1e3},
+        {units::kVolts, "Vm", 0},
+        {units::kVolts, "Hz", 0},
+        // Ohms: "k" and "M" are listed names.
+        {units::kOhms, "ohm", 1},
+        {units::kOhms, "k", 1e3},
+        {units::kOhms, "M", 1e6},
+        {units::kOhms, "m", 1e-3},
+        {units::kOhms, "kohm", 1e3},
+        {units::kOhms, "Mohm", 1e6},
+        {units::kOhms, "mohm", 1e-3},
+        {units::kOhms, "OHM", 1},
+        {units::kOhms, "K", 1e3},
+        {units::kOhms, "KOHM", 1e3},
+        {units::kOhms, "MOHM", 1e6},
+        {units::kOhms, "mOHM", 1e6},
+        {units::kOhms, "s", 0},
+        // Plain numbers: prefix letters only.
+        {units::kPlain, "", 1},
+        {units::kPlain, "k", 1e3},
+        {units::kPlain, "m", 1e-3},
+        {units::kPlain, "M", 1e6},
+        {units::kPlain, "K", 1e3},
+        {units::kPlain, ".", 0},
+        {units::kPlain, "Hz", 0},
+    };
+    for (const auto& c : cases) {
+        const EntryField f("f", 0, 0, 1e300, 0, c.list);
+        const auto p = f.parse(std::string("2.5 ") + c.spelling);
+        if (c.factor == 0) {
+            EXPECT_EQ(p.error.rfind("unknown unit '" + std::string(c.spelling) + "'", 0), 0u)
+                << c.list << " / " << c.spelling << ": " << p.error;
+        } else {
+            // Exactly the double nearest 2.5 x factor, as if typed in the base unit.
+            EXPECT_EQ(p.value,
+                      std::stod("2.5e" + std::to_string(std::lround(std::log10(c.factor)))))
+                << c.list << " / " << c.spelling;
+        }
+    }
+}
+
+TEST(EntryFieldParse, NumbersAndSpellingsWithoutBlanks) {
     const auto f = ifbwField();
     const auto w = widthField();
-    const EntryField ohms("r", 50, 1, 1e6, 0, units::kOhms);
     const std::tuple<const EntryField&, const char*, double> cases[] = {
-        {f, "10k", 1e4},       {f, "10 kHz", 1e4},     {f, "10 khz", 1e4},
-        {f, " 5 ", 5},         {f, "2M", 2e6},         {f, "1.5e3 Hz", 1500},
-        {w, "2.5 us", 2.5e-6}, {w, "2.5usec", 2.5e-6}, {w, "100n", 100e-9},
-        {w, "3 m", 3e-3},  // milli, not mega
-        {w, "3 MSEC", 3e-3},   {w, "4 ps", 4e-12},     {w, "7 \xC2\xB5s", 7e-6},
-        {ohms, "1 M", 1e6},    {ohms, "50 ohm", 50.0},
+        {f, "10k", 1e4},        {f, " 5 ", 5},       {f, "1.5e3 Hz", 1500}, {f, "1.5e3kHz", 1.5e6},
+        {w, "2.5usec", 2.5e-6}, {w, "100n", 100e-9}, {w, "-3ms", -3e-3},
     };
     for (const auto& [field, text, value] : cases)
         EXPECT_EQ(field.parse(text).value, value) << text;
+}
+
+TEST(EntryFieldEnter, MillihertzIsMilliAndTheRangeStillRules) {
+    auto prf = prfField();
+    EXPECT_FALSE(prf.enterText("1 mHz"));  // the lower limit itself
+    EXPECT_EQ(prf.value(), 0.001);
+    EXPECT_EQ(prf.enterText("0.5 mHz"),
+              std::optional<std::string>("0.0005 Hz is outside 0.001 Hz to 165 MHz"));
+    EXPECT_FALSE(prf.enterText("1 MHZ"));
+    EXPECT_EQ(prf.value(), 1e6);
+    EXPECT_EQ(prf.enterText("200 mhz"),
+              std::optional<std::string>("200 MHz is outside 0.001 Hz to 165 MHz"));
+    EXPECT_EQ(ifbwField().parse("1 mHz").value, 0.001);
+    EXPECT_EQ(ifbwField().enterText("1 mHz"),
+              std::optional<std::string>("0.001 Hz is outside 1 Hz to 10 kHz"));
 }
 
 TEST(EntryFieldParse, JunkGivesAReason) {

@@ -26,6 +26,7 @@ class Calculate : public FormTest {
     // Calculate must have failed and left the state unsolved.
     void expectUnsolved(const std::vector<std::string>& messages) {
         EXPECT_EQ(ui.messages, messages);
+        EXPECT_EQ(ui.kinds, std::vector<MessageKind>(messages.size(), MessageKind::Warning));
         EXPECT_TRUE(isTrue(state.NeedsCalculation));
         EXPECT_FALSE(form.b_apply.enabled);
     }
@@ -138,7 +139,7 @@ TEST_F(Calculate, ExternalPathPassesRoundedIfbwAndConverterDelay) {
     EXPECT_EQ(solver.converterDelay, 0.0);
 
     form.m_ConverterMeas_Click();
-    form.setFixedPRF(false);
+    ASSERT_EQ(form.controls().setChecked("chk_FixedPRF", false), std::nullopt);
     form.b_calculate_Click();
     EXPECT_EQ(solver.converterDelay, 6.2e-6);
     EXPECT_EQ(state.ConverterDelay, 6.2e-6);

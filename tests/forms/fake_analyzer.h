@@ -101,26 +101,27 @@ class FakeBench : public Bench {
     }
     IoTrace* trace() override { return nullptr; }
     std::string describe() const override { return "fake analyzer"; }
+    bool simulated() const override { return false; }
 };
 
 class ScriptedInteraction : public Interaction {
   public:
     std::vector<std::string> messages;
+    std::vector<MessageKind> kinds;  // of each message
     std::vector<Pointer> pointers;
-    struct HelpCall {
-        std::string file;
-        int topic = 0;
-    };
-    std::vector<HelpCall> helpCalls;
+    std::vector<HelpRequest> helpCalls;
 
-    void message(const std::string& text) override { messages.push_back(text); }
+    void message(const std::string& text, MessageKind kind) override {
+        messages.push_back(text);
+        kinds.push_back(kind);
+    }
     bool ask(const std::string&) override { return false; }
     std::optional<std::string> chooseOpenFile(const std::string&) override { return std::nullopt; }
     std::optional<std::string> chooseSaveFile(const std::string&) override { return std::nullopt; }
     void processEvents() override {}
     void setPointer(Pointer p) override { pointers.push_back(p); }
-    bool showHelp(const std::string& file, int topic) override {
-        helpCalls.push_back({file, topic});
+    bool showHelp(const HelpRequest& request) override {
+        helpCalls.push_back(request);
         return true;
     }
 };

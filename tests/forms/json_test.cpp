@@ -1,7 +1,11 @@
-// The main window's JSON view: keyed by control name, exact texts and numbers, balanced.
+// The main window's JSON view: one line per control of the table in its order, then the status
+// and the state; exact texts and numbers.
 
-#include <algorithm>
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
 #include <cmath>
+#include <sstream>
 #include <string>
 
 #include "form_fixture.h"
@@ -11,29 +15,15 @@
 namespace zp::test {
 namespace {
 
-// Brackets balance outside strings and no raw control character stands inside one.
-::testing::AssertionResult wellFormed(const std::string& text) {
-    std::string open;
-    bool inString = false;
-    for (std::size_t i = 0; i < text.size(); ++i) {
-        const char c = text[i];
-        if (inString) {
-            if (static_cast<unsigned char>(c) < 0x20)
-                return ::testing::AssertionFailure() << "raw control character at " << i;
-            if (c == '\\') ++i;
-            if (c == '"') inString = false;
-        } else if (c == '"') {
-            inString = true;
-        } else if (c == '{' || c == '[') {
-            open += c == '{' ? '}' : ']';
-        } else if (c == '}' || c == ']') {
-            if (open.empty() || open.back() != c)
-                return ::testing::AssertionFailure() << "unbalanced " << c << " at " << i;
-            open.pop_back();
-        }
-    }
-    if (inString || !open.empty()) return ::testing::AssertionFailure() << "unclosed text";
-    return ::testing::AssertionSuccess();
+QJsonObject parsed(const std::string& text) {
+    QJsonParseError error{};
+    const QJsonDocument doc = QJsonDocument::fromJson(QByteArray::fromStdString(text), &error);
+    EXPECT_EQ(error.error, QJsonParseError::NoError) << error.errorString().toStdString();
+    return doc.object();
+}
+
+std::string str(const QJsonValue& v) {
+    return v.toString().toStdString();
 }
 
 class MainFormJson : public FormTest {
@@ -43,49 +33,68 @@ class MainFormJson : public FormTest {
     }
 };
 
-TEST_F(MainFormJson, ControlsAreKeyedByNameOnePerLine) {
+TEST_F(MainFormJson, OneLinePerControlInTableOrderThenStatusAndState) {
     const std::string text = mainFormJson(form);
-    ASSERT_TRUE(wellFormed(text));
+    std::vector<std::string> expected;
+    for (const auto& item : form.controls().items()) expected.push_back(item.name);
+    expected.insert(expected.end(), {"status", "state"});
+    std::vector<std::string> keys;
+    std::istringstream lines(text);
+    for (std::string line; std::getline(lines, line);) {
+        if (line.rfind(" \"", 0) == 0) keys.push_back(line.substr(2, line.find('"', 2) - 2));
+    }
+    EXPECT_EQ(keys, expected);
+    // The form scripts read, member by member.
     EXPECT_EQ(text.rfind("{\n \"f_PulsedZentra\": {\"caption\": \"Veltrix Zentra Pulse "
                          "Application\", \"width\": 5400, \"height\": 7240},\n",
                          0),
               0u);
-    expectHas(
-        text,
-        {
-            "\n \"VexoEdit_prf\": {\"value\": 5000, \"enabled\": true, \"text\": \"5 kHz\", "
-            "\"lower\": 0.001, \"upper\": 1.65e+08},\n",
-            "\n \"b_apply\": {\"caption\": \"Apply\", \"enabled\": false, \"visible\": true, "
-            "\"left\": 1320, \"top\": 300, \"width\": 975, \"height\": 375},\n",
-            "\n \"chk_FixedPRF\": {\"caption\": \"Fixed PRF\", \"value\": 1, \"enabled\": true, ",
-            "\n \"m_NoSWGating\": {\"caption\": \"No &SW Gating\", \"checked\": false, "
-            "\"enabled\": "
-            "true, \"visible\": true},\n",
-            "\n \"lbl_gate\": [\"Source Modulation :\", \"A IF Gate :\", \"B IF Gate :\", \"R1 IF "
-            "Gate :\", \"R2 IF Gate :\"],\n",
-            "\n \"VexoEdit_width\": [{\"value\": 1e-06, \"enabled\": true, \"text\": \"1 usec\", ",
-        });
+    expectHas(text,
+              {"\n \"VexoEdit_prf\": {\"value\": 5000, \"enabled\": true, \"text\": \"5 kHz\", "
+               "\"lower\": 0.001, \"upper\": 1.65e+08},\n",
+               "\n \"b_apply\": {\"caption\": \"Apply\", \"enabled\": false, \"visible\": true, "
+               "\"left\": 1320, \"top\": 300, \"width\": 975, \"height\": 375},\n",
+               "\n \"chk_FixedPRF\": {\"caption\": \"Fixed PRF\", \"value\": 1, \"enabled\": "
+               "true, ",
+               "\n \"m_NoSWGating\": {\"caption\": \"No &SW Gating\", \"checked\": false, "
+               "\"enabled\": true, \"visible\": true},\n",
+               "\n \"status\": {\"model\": \"KT622A\", \"options\": \"M81\", \"simulated\": "
+               "false, \"needsCalculation\": true, \"text\": \"KT622A M81 - Calculate "
+               "needed\"},\n"});
     EXPECT_EQ(text.substr(text.size() - 4), "}\n}\n");
+
+    const QJsonObject json = parsed(text);
+    EXPECT_EQ(json["lbl_gate"].toArray().size(), 5);
+    EXPECT_EQ(str(json["lbl_gate"][4]), "R2 IF Gate :");
+    EXPECT_EQ(str(json["VexoEdit_width"][0]["text"]), "1 usec");
+    EXPECT_EQ(json["VexoEdit_delay"][4]["upper"].toDouble(), 1.0);
+
+    form.b_calculate_Click();
+    const QJsonObject status = parsed(mainFormJson(form))["status"].toObject();
+    EXPECT_FALSE(status["needsCalculation"].toBool());
+    EXPECT_EQ(str(status["text"]), "KT622A M81 - Calculated");
 }
 
 TEST_F(MainFormJson, StateCarriesTheSetupAndFullPrecision) {
     load(fourPortThreeSources());
     form.VexoEdit_delay[5].setValue(9.444444444444445e-6);
     const std::string text = mainFormJson(form);
-    ASSERT_TRUE(wellFormed(text));
-    expectHas(text,
-              {"\"Is4PortMultiSrc\": true, ", "\"NeedsCalculation\": true, ",
-               "\"UseInternalPG\": 1, ", "\"NumOutputs\": 6, ",
-               "\"ReceiverNames\": [\"A\", \"B\", \"C\", \"D\", \"R1\", \"R2\", \"R3\", "
-               "\"R4\"], ",
-               "\"ReceiverGains\": [3, 3, 3, 3, 3, 3, 3, 3], ",
-               "{\"value\": 9.444444444444445e-06, ", "\"R IF Gate :\"]", "\"height\": 7600}"});
-    // Six table rows of nine cells.
-    const auto table = text.find("\"PGTable\": [[");
-    ASSERT_NE(table, std::string::npos);
-    const std::string rows = text.substr(table, text.find("]]", table) - table);
-    EXPECT_EQ(std::count(rows.begin(), rows.end(), '['), 7);
-    EXPECT_EQ(std::count(rows.begin(), rows.end(), ','), 6 * 8 + 5);
+    EXPECT_NE(text.find("{\"value\": 9.444444444444445e-06, "), std::string::npos);
+    const QJsonObject json = parsed(text);
+    const QJsonObject s = json["state"].toObject();
+    EXPECT_TRUE(s["Is4PortMultiSrc"].toBool());
+    EXPECT_TRUE(s["NeedsCalculation"].toBool());
+    EXPECT_EQ(s["UseInternalPG"].toInt(), 1);
+    EXPECT_EQ(s["NumOutputs"].toInt(), 6);
+    EXPECT_EQ(s["ReceiverNames"].toArray(),
+              QJsonArray({"A", "B", "C", "D", "R1", "R2", "R3", "R4"}));
+    EXPECT_EQ(s["ReceiverGains"].toArray(), QJsonArray({3, 3, 3, 3, 3, 3, 3, 3}));
+    EXPECT_EQ(json["VexoEdit_delay"][5]["value"].toDouble(), 9.444444444444445e-6);
+    EXPECT_EQ(str(json["lbl_gate"][5]), "R IF Gate :");
+    EXPECT_EQ(json["f_PulsedZentra"]["height"].toInt(), 7600);
+    const QJsonArray table = s["PGTable"].toArray();
+    ASSERT_EQ(table.size(), 6);
+    for (const QJsonValue& row : table) EXPECT_EQ(row.toArray().size(), 9);
 }
 
 TEST_F(MainFormJson, TextsAreEscaped) {
@@ -94,8 +103,11 @@ TEST_F(MainFormJson, TextsAreEscaped) {
     form.b_calculate_Click();
     form.lbl_gate[2].caption = "Q\"uote\\ \t\x01";
     const std::string text = mainFormJson(form);
-    ASSERT_TRUE(wellFormed(text));
-    expectHas(text, {"A IF Gate :12.5%\\n", "\"Q\\\"uote\\\\ \\t\\u0001\""});
+    EXPECT_NE(text.find("\"Q\\\"uote\\\\ \\t\\u0001\""), std::string::npos);
+    const QJsonObject json = parsed(text);
+    EXPECT_EQ(str(json["lbl_gate"][2]), "Q\"uote\\ \t\x01");
+    EXPECT_NE(str(json["lbl_DutyCycle"]["caption"]).find("\nA IF Gate :12.5%\n"),
+              std::string::npos);
 }
 
 TEST(JsonWriter, NonFiniteNumbersBecomeNull) {

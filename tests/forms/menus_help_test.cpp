@@ -78,19 +78,23 @@ TEST_F(Help, OpensTheReportedFileWithoutQuotesOrLineFeeds) {
         ASSERT_EQ(ui.helpCalls.size(), 1u);
         EXPECT_EQ(ui.helpCalls[0].file, file);
         EXPECT_EQ(ui.helpCalls[0].topic, 1114);
+        EXPECT_EQ(ui.helpCalls[0].analyzerError, std::nullopt);
     }
     EXPECT_TRUE(ui.messages.empty());
 }
 
-TEST_F(Help, FailingQueryIsReportedNotThrown) {
+// The view shows our own manual then; the request says why the analyzer's is missing.
+TEST_F(Help, FailingQueryAsksForOurManualWithTheAnalyzersError) {
     bench.setup.helpError = "-113 Undefined header";
     EXPECT_NO_THROW(form.m_contents_Click());
-    EXPECT_EQ(ui.messages, std::vector<std::string>{"-113 Undefined header"});
-    EXPECT_TRUE(ui.helpCalls.empty());
-
     bench.setup.unreachable = true;
     EXPECT_NO_THROW(form.m_contents_Click());
-    EXPECT_EQ(ui.messages.size(), 2u);
+    ASSERT_EQ(ui.helpCalls.size(), 2u);
+    EXPECT_EQ(ui.helpCalls[0].file, "");
+    EXPECT_EQ(ui.helpCalls[0].topic, 1114);
+    EXPECT_EQ(ui.helpCalls[0].analyzerError, "-113 Undefined header");
+    EXPECT_EQ(ui.helpCalls[1].analyzerError, "Analyzer not reachable");
+    EXPECT_TRUE(ui.messages.empty());
 }
 
 }  // namespace

@@ -28,7 +28,7 @@ TEST(OnSimBench, DefaultSolverKeepsOrMovesThePrf) {
     EXPECT_EQ(state.SolvedIFCount, 2);
     EXPECT_TRUE(form.b_apply.enabled);
 
-    form.setFixedPRF(false);
+    ASSERT_EQ(form.controls().setChecked("chk_FixedPRF", false), std::nullopt);
     ASSERT_EQ(form.VexoEdit_IFBW.enter(3000), std::nullopt);
     form.b_calculate_Click();
     EXPECT_EQ(form.VexoEdit_prf.value(), 6000);

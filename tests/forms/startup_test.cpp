@@ -46,7 +46,7 @@ TEST_F(Startup, RowsAndMenusFollowTheModel) {
 
 TEST_F(Startup, SixthRowIsAFullRow) {
     load(fourPortThreeSources());
-    EXPECT_EQ(form.fieldGeometry.at("VexoEdit_width(5)").top, 2280);
+    EXPECT_EQ(form.controls().fieldGeometry("VexoEdit_width(5)").top, 2280);
     EXPECT_EQ(form.b_close.geometry.top, 6240);
     type(form.VexoEdit_width[5], 2e-6);
     EXPECT_EQ(form.VexoEdit_width[5].value(), 2e-6);

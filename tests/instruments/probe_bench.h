@@ -35,6 +35,7 @@ class ProbeBench : public Bench {
     }
     IoTrace* trace() override { return sim_.trace(); }
     std::string describe() const override { return sim_.describe(); }
+    bool simulated() const override { return sim_.simulated(); }
 
     // The trace with "release Application" and "release Bus" where those objects went.
     std::vector<std::string> timeline() {

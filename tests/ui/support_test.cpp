@@ -11,6 +11,7 @@
 #include <QTextBrowser>
 #include <QTimer>
 #include <csignal>
+#include <functional>
 
 #include "ui/help_viewer.h"
 #include "ui/single_instance.h"
@@ -56,6 +57,7 @@ struct ShownBox {
     bool seen = false;
     Qt::TextFormat format = Qt::AutoText;
     QString text;
+    QMessageBox::Icon icon = QMessageBox::NoIcon;
 };
 
 std::unique_ptr<QTimer> answerNextBox(ShownBox& shown, QMessageBox::StandardButton press) {
@@ -65,7 +67,8 @@ std::unique_ptr<QTimer> answerNextBox(ShownBox& shown, QMessageBox::StandardButt
             auto* box = qobject_cast<QMessageBox*>(w);
             if (box == nullptr || !box->isVisible()) continue;
             const auto* label = box->findChild<QLabel*>(QStringLiteral("qt_msgbox_label"));
-            shown = {true, label ? label->textFormat() : Qt::AutoText, label ? label->text() : ""};
+            shown = {true, label ? label->textFormat() : Qt::AutoText, label ? label->text() : "",
+                     box->icon()};
             box->done(press);
         }
     });
@@ -73,22 +76,30 @@ std::unique_ptr<QTimer> answerNextBox(ShownBox& shown, QMessageBox::StandardButt
     return timer;
 }
 
-TEST(QtInteraction, BoxesShowInstrumentTextAsPlainTextNeverAsMarkup) {
+TEST(QtInteraction, BoxesShowPlainTextWithTheIconOfTheirKind) {
     application();
     QtInteraction ui({});
     const std::string reply = "<img src=\"file:///etc/hosts\"><b>-113</b> Undefined header";
-    for (const bool question : {false, true}) {
-        SCOPED_TRACE(question ? "ask" : "message");
+    struct Case {
+        const char* what;
+        std::function<void()> show;
+        QMessageBox::Icon icon;
+    };
+    const Case cases[] = {
+        {"information", [&] { ui.message(reply, MessageKind::Information); },
+         QMessageBox::Information},
+        {"warning", [&] { ui.message(reply, MessageKind::Warning); }, QMessageBox::Warning},
+        {"question", [&] { EXPECT_TRUE(ui.ask(reply)); }, QMessageBox::Question},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.what);
         ShownBox shown;
         const auto answering = answerNextBox(shown, QMessageBox::Yes);
-        if (question) {
-            EXPECT_TRUE(ui.ask(reply));
-        } else {
-            ui.message(reply);
-        }
+        c.show();
         ASSERT_TRUE(shown.seen);
         EXPECT_EQ(shown.format, Qt::PlainText);
         EXPECT_EQ(shown.text.toStdString(), reply);
+        EXPECT_EQ(shown.icon, c.icon);
     }
 }
 
@@ -135,27 +146,67 @@ TEST_F(HelpFiles, OnlyExistingFilesInsideTheManualFolderAreShown) {
     EXPECT_FALSE(checkHelpFile(manual() + "/zentra-pulse.html", {}).ok());
 }
 
-TEST_F(HelpFiles, ShowHelpOpensTheViewerAtTheTopicOrSaysWhyNot) {
+// A file the analyzer names that cannot be shown: our manual, with a line saying why.
+TEST_F(HelpFiles, ShowHelpOpensTheTopicOfTheNamedFileOrOfOurManual) {
     QtInteraction ui({manual()});
     ui.setUnattended(true);
-    EXPECT_FALSE(ui.showHelp(root_.filePath("elsewhere/secret.html").toStdString(), 1114));
-    EXPECT_EQ(ui.helpViewer(), nullptr);
-    EXPECT_TRUE(ui.lastMessage().contains("not part of the Zentra Pulse manual"));
+    const std::pair<QString, QString> cases[] = {
+        {manual() + "/zentra-pulse.html", ""},
+        {root_.filePath("elsewhere/secret.html"),
+         "The help file \"" + root_.filePath("elsewhere/secret.html") +
+             "\" is not part of the Zentra Pulse manual. This is the Zentra Pulse manual."},
+        {manual() + "/nothing.html", "The help file \"" + manual() +
+                                         "/nothing.html\" was not found. This is the Zentra "
+                                         "Pulse manual."},
+    };
+    for (const auto& [file, note] : cases) {
+        SCOPED_TRACE(file.toStdString());
+        EXPECT_TRUE(ui.showHelp({file.toStdString(), 1114, std::nullopt}));
+        ASSERT_NE(ui.helpViewer(), nullptr);
+        EXPECT_TRUE(ui.helpViewer()->isVisible());
+        const QUrl shown = ui.helpViewer()->browser()->source();
+        EXPECT_EQ(shown.toLocalFile(),
+                  QFileInfo(manual() + "/zentra-pulse.html").canonicalFilePath());
+        EXPECT_EQ(shown.fragment(), "topic-1114");
+        EXPECT_EQ(ui.helpViewer()->note()->text(), note);
+        EXPECT_EQ(ui.helpViewer()->note()->isVisibleTo(ui.helpViewer()), !note.isEmpty());
+    }
+    EXPECT_TRUE(ui.lastMessage().isEmpty());
+    ui.helpViewer()->close();
 
-    EXPECT_TRUE(ui.showHelp((manual() + "/zentra-pulse.html").toStdString(), 1114));
-    ASSERT_NE(ui.helpViewer(), nullptr);
-    EXPECT_EQ(ui.helpViewer()->browser()->source().fragment(), "topic-1114");
-    EXPECT_TRUE(ui.helpViewer()->isVisible());
+    // Without our manual either, a warning says both.
+    QtInteraction lost({root_.filePath("elsewhere")});
+    lost.setUnattended(true);
+    EXPECT_FALSE(lost.showHelp({"", 1114, "-113 Undefined header"}));
+    EXPECT_EQ(lost.helpViewer(), nullptr);
+    EXPECT_EQ(lost.lastMessage(),
+              "The analyzer named no help file (-113 Undefined header). The "
+              "Zentra Pulse manual was not found in " +
+                  root_.filePath("elsewhere") + ".");
+    EXPECT_EQ(lost.lastMessageKind(), MessageKind::Warning);
 }
 
-TEST(SingleInstance, KeyIsNamedAfterTheUserUnlessOverridden) {
+TEST(SingleInstance, KeyIsPerUserAndDisplayUnlessOverridden) {
+    application();
+    const auto keyOn = [](const char* display) {
+        qputenv("DISPLAY", display);
+        return SingleInstance::defaultKey();
+    };
+    const QByteArray display = qgetenv("DISPLAY");
+    const QByteArray wayland = qgetenv("WAYLAND_DISPLAY");
+    qunsetenv("WAYLAND_DISPLAY");
     qputenv("ZP_INSTANCE_KEY", "");
-    const QString key = SingleInstance::defaultKey();
-    EXPECT_TRUE(key.startsWith("zentra-pulse-"));
-    EXPECT_FALSE(key.contains('/'));
+    const QString key = keyOn(":1");
+    EXPECT_TRUE(key.startsWith("zentra-pulse-")) << key.toStdString();
+    EXPECT_TRUE(key.endsWith("-offscreen-_1")) << key.toStdString();
+    EXPECT_EQ(keyOn(":1"), key);
+    EXPECT_NE(keyOn(":2"), key);
+    EXPECT_FALSE(keyOn("/run/user/1000/a very long display socket path").contains('/'));
     qputenv("ZP_INSTANCE_KEY", "custom-key");
     EXPECT_EQ(SingleInstance::defaultKey(), "custom-key");
     qunsetenv("ZP_INSTANCE_KEY");
+    qputenv("DISPLAY", display);
+    if (!wayland.isEmpty()) qputenv("WAYLAND_DISPLAY", wayland);
 }
 
 TEST(StopSignals, SigtermAndSigintEndTheEventLoopInsteadOfTheProcess) {

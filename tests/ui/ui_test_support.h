@@ -32,7 +32,8 @@ inline QString manualFolder() {
 }
 
 struct Window {
-    explicit Window(const std::string& model) : bench(model), ui(QStringList{manualFolder()}) {
+    explicit Window(const std::string& model, sim::SimFaults faults = {})
+        : bench(model, std::move(faults)), ui(QStringList{manualFolder()}) {
         application();
         ui.setUnattended(true);
         form = std::make_unique<MainForm>(pulsedModule(), bench, ui);
