@@ -17,6 +17,7 @@ struct ScpiErrorCode {
     const char* text;
 };
 
+// Command errors: the message cannot be read.
 inline constexpr ScpiErrorCode kSyntaxError{-102, "Syntax error"};
 inline constexpr ScpiErrorCode kDataTypeError{-104, "Data type error"};
 inline constexpr ScpiErrorCode kParameterNotAllowed{-108, "Parameter not allowed"};
@@ -25,9 +26,11 @@ inline constexpr ScpiErrorCode kUndefinedHeader{-113, "Undefined header"};
 inline constexpr ScpiErrorCode kHeaderSuffixOutOfRange{-114, "Header suffix out of range"};
 inline constexpr ScpiErrorCode kInvalidSuffix{-131, "Invalid suffix"};
 inline constexpr ScpiErrorCode kStringDataError{-150, "String data error"};
+// Execution errors: the message was read but cannot be carried out.
 inline constexpr ScpiErrorCode kSettingsConflict{-221, "Settings conflict"};
 inline constexpr ScpiErrorCode kDataOutOfRange{-222, "Data out of range"};
 inline constexpr ScpiErrorCode kIllegalParameterValue{-224, "Illegal parameter value"};
+// Device errors.
 inline constexpr ScpiErrorCode kQueueOverflow{-350, "Queue overflow"};
 
 // The queue entry text, e.g. -113,"Undefined header".
