@@ -6,19 +6,20 @@
 #include <QPixmap>
 #include <QTimer>
 #include <iostream>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
-#include "common/bench_options.h"
-#include "forms/main_form.h"
-#include "instruments/instrument_error.h"
+#include "common/startup.h"
 #include "ui/main_window.h"
 #include "ui/qt_interaction.h"
 #include "ui/single_instance.h"
 #include "ui/stop_signals.h"
 
 namespace {
+
+using namespace zp::app;
 
 // Where help files may come from: the manual in the source tree, the installed one, and the one
 // installed beside this program when the installation was moved.
@@ -28,69 +29,80 @@ QStringList manualFolders() {
                 .absoluteFilePath(QStringLiteral("../share/zentra-pulse/help"))};
 }
 
+class GuiFrontEnd : public FrontEnd {
+  public:
+    GuiFrontEnd(int& argc, char** argv) : argc_(argc), argv_(argv) {}
+
+    std::optional<int> prepare(const ParsedCommandLine& cmd) override {
+        app_ = std::make_unique<QApplication>(argc_, argv_);
+        QApplication::setApplicationName(QStringLiteral("zentra-pulse"));
+        QApplication::setApplicationVersion(QStringLiteral(ZP_VERSION));
+        // SIGTERM and SIGINT close the program like its window does, so the instance socket goes
+        // too.
+        stopSignals_ = std::make_unique<zp::ui::StopSignals>();
+
+        // A second start hands over before anything else runs. A screenshot run stands alone.
+        instance_ = std::make_unique<zp::ui::SingleInstance>(zp::ui::SingleInstance::defaultKey());
+        screenshot_ = cmd.options.screenshot;
+        if (!screenshot_ && instance_->start() == zp::ui::SingleInstance::Role::Secondary) {
+            std::cerr << "zentra-pulse: already running on this display; brought it to the front\n";
+            return 0;
+        }
+        ui_ = std::make_unique<zp::ui::QtInteraction>(manualFolders());
+        ui_->setUnattended(screenshot_.has_value());
+        return std::nullopt;
+    }
+
+    zp::Interaction& interaction() override { return *ui_; }
+
+    void showStartupFailure(StartupFailure failure, const std::string& text) override {
+        ui_->message(failure == StartupFailure::AnalyzerUnreachable
+                         ? "The analyzer cannot be reached: " + text + "\nThe program ends."
+                         : "The program could not start: " + text,
+                     zp::MessageKind::Warning);
+    }
+
+    int run(zp::MainForm& form, zp::Bench&) override {
+        zp::ui::MainWindow window(form, *ui_);
+        ui_->setWindow(&window);
+        QObject::connect(instance_.get(), &zp::ui::SingleInstance::raiseRequested, &window,
+                         [&window] {
+                             std::cerr << "zentra-pulse: raised by a second start" << std::endl;
+                             window.bringToFront();
+                         });
+        window.show();
+        // From here a second start is heard and answered: scripts and tests wait for this line.
+        if (instance_->listening()) {
+            std::cerr << "zentra-pulse: listening for a second start" << std::endl;
+        }
+
+        if (screenshot_) {
+            const QString file = QString::fromStdString(*screenshot_);
+            QTimer::singleShot(300, &window, [&window, file] {
+                const bool saved = window.grab().save(file, "PNG");
+                if (!saved)
+                    std::cerr << "zentra-pulse: cannot write " << file.toStdString() << '\n';
+                QApplication::exit(saved ? 0 : 1);
+            });
+        }
+        if (stopSignals_->received() != 0) return 0;
+        return QApplication::exec();
+    }
+
+  private:
+    int& argc_;
+    char** argv_;
+    std::optional<std::string> screenshot_;
+    // Declared in the order they are made, so that they go in reverse.
+    std::unique_ptr<QApplication> app_;
+    std::unique_ptr<zp::ui::StopSignals> stopSignals_;
+    std::unique_ptr<zp::ui::SingleInstance> instance_;
+    std::unique_ptr<zp::ui::QtInteraction> ui_;
+};
+
 }  // namespace
 
 int main(int argc, char** argv) {
-    using namespace zp::app;
-    const std::vector<std::string> args(argv + 1, argv + argc);
-    const ParsedCommandLine cmd = parseCommandLine(args, Program::Gui);
-    if (const std::optional<int> status = earlyExit(cmd, Program::Gui, std::cout, std::cerr)) {
-        return *status;
-    }
-    const BenchOptions& options = cmd.options;
-
-    QApplication app(argc, argv);
-    QApplication::setApplicationName(QStringLiteral("zentra-pulse"));
-    QApplication::setApplicationVersion(QStringLiteral(ZP_VERSION));
-    // SIGTERM and SIGINT close the program like its window does, so the instance socket goes too.
-    const zp::ui::StopSignals stopSignals;
-
-    // A second start hands over before anything else runs. A screenshot run stands alone.
-    zp::ui::SingleInstance instance(zp::ui::SingleInstance::defaultKey());
-    if (!options.screenshot && instance.start() == zp::ui::SingleInstance::Role::Secondary) {
-        std::cerr << "zentra-pulse: already running on this display; brought it to the front\n";
-        return 0;
-    }
-
-    const std::unique_ptr<zp::sim::SimBench> bench =
-        makeBenchOrReport(options, Program::Gui, std::cerr);
-    if (!bench) return kUsageExit;
-
-    zp::ui::QtInteraction ui(manualFolders());
-    ui.setUnattended(options.screenshot.has_value());
-    zp::MainForm form(zp::pulsedModule(), *bench, ui);
-    try {
-        form.Form_Load();
-    } catch (const zp::InstrumentError& e) {
-        ui.message("The analyzer cannot be reached: " + e.description() + "\nThe program ends.",
-                   zp::MessageKind::Warning);
-        return 1;
-    } catch (const std::exception& e) {
-        ui.message(std::string("The program could not start: ") + e.what(),
-                   zp::MessageKind::Warning);
-        return 1;
-    }
-
-    zp::ui::MainWindow window(form, ui);
-    ui.setWindow(&window);
-    QObject::connect(&instance, &zp::ui::SingleInstance::raiseRequested, &window, [&window] {
-        std::cerr << "zentra-pulse: raised by a second start" << std::endl;
-        window.bringToFront();
-    });
-    window.show();
-    // From here a second start is heard and answered: scripts and tests wait for this line.
-    if (instance.listening()) {
-        std::cerr << "zentra-pulse: listening for a second start" << std::endl;
-    }
-
-    if (options.screenshot) {
-        const QString file = QString::fromStdString(*options.screenshot);
-        QTimer::singleShot(300, &window, [&window, file] {
-            const bool saved = window.grab().save(file, "PNG");
-            if (!saved) std::cerr << "zentra-pulse: cannot write " << file.toStdString() << '\n';
-            QApplication::exit(saved ? 0 : 1);
-        });
-    }
-    if (stopSignals.received() != 0) return 0;
-    return QApplication::exec();
+    GuiFrontEnd frontEnd(argc, argv);
+    return runFrontEnd(Program::Gui, std::vector<std::string>(argv + 1, argv + argc), frontEnd);
 }

@@ -18,8 +18,8 @@
 #include <string_view>
 #include <vector>
 
-#include "sim/scpi_server.h"
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
+#include "sim/server/scpi_server.h"
 
 namespace {
 

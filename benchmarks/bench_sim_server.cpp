@@ -4,21 +4,17 @@
 // (peak_conn_MiB) and the process's peak resident size (VmHWM_MiB).
 
 #include <benchmark/benchmark.h>
-#include <netinet/in.h>
-#include <netinet/tcp.h>
-#include <sys/socket.h>
-#include <unistd.h>
 
 #include <cstdint>
 #include <fstream>
 #include <map>
 #include <memory>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
-#include "sim/scpi_server.h"
-#include "sim/sim_generator.h"
+#include "loopback_socket.h"
+#include "sim/generators/sim_generator.h"
+#include "sim/server/scpi_server.h"
 
 namespace {
 
@@ -38,39 +34,16 @@ double statusMiB(const std::string& key) {
     return 0;
 }
 
+// Reads into one 64 KiB buffer, as the program's links do.
 class Client {
   public:
-    explicit Client(int port) : fd_(::socket(AF_INET, SOCK_STREAM, 0)) {
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_port = htons(static_cast<std::uint16_t>(port));
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        if (::connect(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a) != 0) {
-            throw std::runtime_error("connect");
-        }
-        const int one = 1;
-        ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
-    }
-    ~Client() { ::close(fd_); }
-    Client(const Client&) = delete;
-    Client& operator=(const Client&) = delete;
-
-    void write(const std::string& text) {
-        for (std::size_t done = 0; done < text.size();) {
-            const ssize_t n = ::send(fd_, text.data() + done, text.size() - done, MSG_NOSIGNAL);
-            if (n <= 0) throw std::runtime_error("send");
-            done += static_cast<std::size_t>(n);
-        }
-    }
+    explicit Client(int port) : socket_(port) {}
+    void write(const std::string& text) { socket_.send(text); }
     // Reads at most one buffer; the byte count.
-    std::size_t readSome() {
-        const ssize_t n = ::recv(fd_, buffer_.data(), buffer_.size(), 0);
-        if (n <= 0) throw std::runtime_error("recv");
-        return static_cast<std::size_t>(n);
-    }
+    std::size_t readSome() { return socket_.receive(buffer_.data(), buffer_.size()); }
 
   private:
-    int fd_;
+    zp::benchmarks::LoopbackSocket socket_;
     std::vector<char> buffer_ = std::vector<char>(64 * 1024);
 };
 

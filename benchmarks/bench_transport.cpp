@@ -2,20 +2,16 @@
 // per second through the bus, beside a bare blocking-socket loop, and a 4 MiB reply.
 
 #include <benchmark/benchmark.h>
-#include <netinet/in.h>
-#include <netinet/tcp.h>
-#include <sys/socket.h>
-#include <unistd.h>
 
 #include <cstdint>
 #include <initializer_list>
 #include <map>
 #include <memory>
-#include <stdexcept>
 #include <string>
 
-#include "sim/scpi_server.h"
-#include "sim/sim_generator.h"
+#include "loopback_socket.h"
+#include "sim/generators/sim_generator.h"
+#include "sim/server/scpi_server.h"
 #include "transport/transport_factory.h"
 
 namespace {
@@ -45,49 +41,23 @@ Loopback& loopback() {
 }
 
 // The baseline: what a plain blocking client with Nagle off achieves.
-class BareSocket {
-  public:
-    explicit BareSocket(int port) : fd_(::socket(AF_INET, SOCK_STREAM, 0)) {
-        sockaddr_in a{};
-        a.sin_family = AF_INET;
-        a.sin_port = htons(static_cast<std::uint16_t>(port));
-        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        if (::connect(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a) != 0) {
-            throw std::runtime_error("connect");
-        }
-        const int one = 1;
-        ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &one, sizeof one);
+std::string readLine(zp::benchmarks::LoopbackSocket& socket) {
+    std::string out;
+    char buffer[256];
+    while (out.empty() || out.back() != '\n') {
+        out.append(buffer, socket.receive(buffer, sizeof buffer));
     }
-    ~BareSocket() { ::close(fd_); }
-    void send(std::string_view text) {
-        if (::send(fd_, text.data(), text.size(), MSG_NOSIGNAL) !=
-            static_cast<ssize_t>(text.size())) {
-            throw std::runtime_error("send");
-        }
-    }
-    std::string line() {
-        std::string out;
-        char buffer[256];
-        while (out.empty() || out.back() != '\n') {
-            const ssize_t n = ::recv(fd_, buffer, sizeof buffer, 0);
-            if (n <= 0) throw std::runtime_error("recv");
-            out.append(buffer, static_cast<std::size_t>(n));
-        }
-        return out;
-    }
-
-  private:
-    int fd_;
-};
+    return out;
+}
 
 // Every command goes out in turn; the last one is the query whose one-line reply is read back.
 using Commands = std::initializer_list<std::string_view>;
 
 void bareRoundTrips(benchmark::State& state, Commands commands) {
-    BareSocket s(loopback().server->port(11));
+    zp::benchmarks::LoopbackSocket s(loopback().server->port(11));
     for (auto _ : state) {
         for (const auto command : commands) s.send(command);
-        benchmark::DoNotOptimize(s.line());
+        benchmark::DoNotOptimize(readLine(s));
     }
     state.SetItemsProcessed(state.iterations());
 }

@@ -4,6 +4,8 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "common/cli_actions.h"
+#include "sim/faults.h"
 #include "transport/transport_factory.h"
 
 namespace zp::app {
@@ -38,6 +40,24 @@ std::string checkAnalyzer(const std::string& value, std::string& model) {
     }
     model = name;
     return {};
+}
+
+// Each action's usage with its help beside it, or below it when the usage is too long.
+void printActionHelp(std::ostream& out) {
+    constexpr std::size_t kHelpColumn = 30;
+    for (const ActionKind& kind : actionTable()) {
+        std::string line = "  " + kind.usage;
+        std::istringstream help(kind.help);
+        for (std::string text; std::getline(help, text); line.clear()) {
+            if (line.size() + 2 > kHelpColumn) {
+                out << line << '\n';
+                line.clear();
+            }
+            line.resize(kHelpColumn, ' ');
+            out << line << text << '\n';
+        }
+        if (!line.empty()) out << line << '\n';
+    }
 }
 
 }  // namespace
@@ -137,30 +157,6 @@ ParsedCommandLine parseCommandLine(const std::vector<std::string>& args, Program
     return result;
 }
 
-std::unique_ptr<sim::SimBench> makeBench(const BenchOptions& options) {
-    sim::SimFaults faults;
-    for (const std::string& fault : options.faults) faults.add(fault);
-    auto bench = std::make_unique<sim::SimBench>(options.model, std::move(faults));
-    if (options.traceFile) bench->trace()->openFile(*options.traceFile);
-    if (options.bus) {
-        BusResources resources = parseBusResources(*options.bus);
-        IoTrace* trace = bench->trace();
-        bench->setBusFactory([resources, trace] { return makeTransportBus(resources, trace); },
-                             "generators on " + *options.bus);
-    }
-    return bench;
-}
-
-std::unique_ptr<sim::SimBench> makeBenchOrReport(const BenchOptions& options, Program program,
-                                                 std::ostream& err) {
-    try {
-        return makeBench(options);
-    } catch (const std::exception& e) {
-        err << programName(program) << ": " << e.what() << '\n';
-        return nullptr;
-    }
-}
-
 std::optional<int> earlyExit(const ParsedCommandLine& cmd, Program program, std::ostream& out,
                              std::ostream& err) {
     if (!cmd.error.empty()) {
@@ -203,14 +199,8 @@ std::string usageText(Program program) {
     out << "  --help, -h            show this help and exit\n"
            "  --version             show the version and exit\n";
     if (cli) {
-        out << "\nActions (run in order; the first failure ends the run with status 1):\n"
-               "  set prf|pri|ifbw VALUE        e.g. set prf 10k, set pri 200us\n"
-               "  set width|delay ROW VALUE     e.g. set width 0 2.5us\n"
-               "  set fixedprf|converter|nopg|noswgating|pulsed on|off\n"
-               "  step prf|pri|ifbw up|down     step width|delay ROW up|down\n"
-               "  calculate                     solve the timing\n"
-               "  show                          print the main window state as JSON\n"
-               "  help                          print the help file the analyzer reports\n";
+        out << "\nActions (run in order; the first failure ends the run with status 1):\n";
+        printActionHelp(out);
     }
     out << "\nExit status: 0 success, 1 failure, 2 bad command line.\n";
     return out.str();

@@ -3,12 +3,11 @@
 // generator transport, faults to inject and the I/O trace.
 
 #include <iosfwd>
-#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
-#include "sim/sim_bench.h"
+#include "sim/sim_model.h"
 
 namespace zp::app {
 
@@ -38,15 +37,6 @@ struct ParsedCommandLine {
 // option or after "--"; every value is checked here so that a bad one is reported before anything
 // starts. The GUI accepts no further arguments.
 ParsedCommandLine parseCommandLine(const std::vector<std::string>& args, Program program);
-
-// Builds the bench the options describe: the simulated analyzer model with its faults, the
-// generator transport and the trace file. Throws std::invalid_argument / std::runtime_error.
-std::unique_ptr<sim::SimBench> makeBench(const BenchOptions& options);
-
-// Builds the bench, or reports why it cannot on `err` (prefixed with the program's name) and
-// returns nothing; the program then ends with kUsageExit.
-std::unique_ptr<sim::SimBench> makeBenchOrReport(const BenchOptions& options, Program program,
-                                                 std::ostream& err);
 
 // What the command line settles before anything starts: an unusable one is reported on `err`
 // (exit status kUsageExit); --help, --version and --list-models write their text to `out`

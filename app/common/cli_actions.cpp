@@ -47,6 +47,17 @@ std::string wordList(bool fieldsOnly) {
     return list;
 }
 
+// "prf|pri|ifbw|width ROW|delay ROW" or the toggles, for --help.
+std::string helpWords(bool toggles) {
+    std::string list;
+    for (const Word& w : kWords) {
+        if ((w.takes == Takes::OnOff) != toggles) continue;
+        list += (list.empty() ? "" : "|") + std::string(w.word);
+        if (w.takes == Takes::RowValue) list += " ROW";
+    }
+    return list;
+}
+
 // A field of the window as the words name it.
 struct FieldRef {
     const Word* word;
@@ -206,11 +217,14 @@ const std::string& WordCursor::next(const std::string& action, const std::string
 
 const std::vector<ActionKind>& actionTable() {
     static const std::vector<ActionKind> kTable = {
-        {"set", "set FIELD [ROW] VALUE | set TOGGLE on|off", parseSet},
-        {"step", "step FIELD [ROW] up|down", parseStep},
-        {"calculate", "calculate", parseCalculate},
-        {"show", "show", parseShow},
-        {"help", "help", parseHelp},
+        {"set", "set FIELD [ROW] VALUE | set TOGGLE on|off", parseSet,
+         "type VALUE into a field, or set a toggle\nFIELD: " + helpWords(false) +
+             "\nTOGGLE: " + helpWords(true) + "\nVALUE: a number with a unit, e.g. 10k, 200us"},
+        {"step", "step FIELD [ROW] up|down", parseStep,
+         "one step of the field, as the arrow keys do"},
+        {"calculate", "calculate", parseCalculate, "solve the timing"},
+        {"show", "show", parseShow, "print the main window state as JSON"},
+        {"help", "help", parseHelp, "print the help file the analyzer reports"},
     };
     return kTable;
 }

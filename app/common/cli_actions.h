@@ -55,6 +55,7 @@ struct ActionKind {
     std::string name;
     std::string usage;
     std::function<Action(WordCursor&)> parse;  // the action's name has been taken already
+    std::string help;  // what it does, for --help; one line each, 50 characters at most
 };
 
 const std::vector<ActionKind>& actionTable();

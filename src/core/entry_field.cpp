@@ -8,27 +8,11 @@
 
 #include "core/decimal_digits.h"
 #include "core/numeric.h"
+#include "core/text.h"
 
 namespace zp {
 
 namespace {
-
-constexpr std::string_view kBlanks = " \t\r\n";
-
-std::string_view trim(std::string_view s) {
-    const auto first = s.find_first_not_of(kBlanks);
-    if (first == std::string_view::npos) return {};
-    return s.substr(first, s.find_last_not_of(kBlanks) - first + 1);
-}
-
-char lower(char c) {
-    return (c >= 'A' && c <= 'Z') ? static_cast<char>(c - 'A' + 'a') : c;
-}
-
-bool equalsIgnoreCase(std::string_view a, std::string_view b) {
-    return a.size() == b.size() && std::equal(a.begin(), a.end(), b.begin(),
-                                              [](char x, char y) { return lower(x) == lower(y); });
-}
 
 // Both micro signs become 'u' so that "µs" and "μsec" read as "us".
 std::string asciiMicro(std::string_view s) {
@@ -99,7 +83,7 @@ std::optional<double> siPrefix(char c) {
 // SCPI prefix letters ignore case, so "M" is milli there too, except in MHZ and MOHM.
 std::optional<double> scpiPrefix(char c, std::string_view base) {
     if (lower(c) == 'm') {
-        return equalsIgnoreCase(base, "hz") || equalsIgnoreCase(base, "ohm") ? 1e6 : 1e-3;
+        return equalsIgnoringCase(base, "hz") || equalsIgnoringCase(base, "ohm") ? 1e6 : 1e-3;
     }
     if (lower(c) == 'g') return 1e9;
     return siPrefix(lower(c));  // p, n, u, k
@@ -114,7 +98,7 @@ std::optional<std::string> shortForm(const std::string& name) {
 }
 
 bool same(std::string_view a, std::string_view b, bool ignoreCase) {
-    return ignoreCase ? equalsIgnoreCase(a, b) : a == b;
+    return ignoreCase ? equalsIgnoringCase(a, b) : a == b;
 }
 
 // "." stands for "no unit" and is never typed.

@@ -7,6 +7,7 @@
 #include <system_error>
 
 #include "core/decimal_digits.h"
+#include "core/text.h"
 
 namespace zp {
 
@@ -114,10 +115,8 @@ std::string exportText(double v) {
 }
 
 std::optional<double> parseNumber(std::string_view text) {
-    constexpr std::string_view blanks = " \t\r\n";
-    const auto first = text.find_first_not_of(blanks);
-    if (first == std::string_view::npos) return std::nullopt;
-    text = text.substr(first, text.find_last_not_of(blanks) - first + 1);
+    text = trim(text);
+    if (text.empty()) return std::nullopt;
 
     // Check the shape ourselves: from_chars would also take "inf", "nan" and hex digits.
     std::size_t i = 0;

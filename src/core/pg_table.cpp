@@ -6,6 +6,7 @@
 #include <string>
 
 #include "core/numeric.h"
+#include "core/text.h"
 
 namespace zp {
 
@@ -14,22 +15,6 @@ namespace {
 const char* const kColumnNames[PGColumnCount] = {"GateOutput", "GpibAddress",   "Master",
                                                  "Enabled",    "HighLevel",     "LowLevel",
                                                  "Complement", "LoadImpedance", "IntPGOutput"};
-
-bool equalsIgnoreCase(std::string_view a, std::string_view b) {
-    if (a.size() != b.size()) return false;
-    for (std::size_t i = 0; i < a.size(); ++i) {
-        const auto lower = [](char c) { return (c >= 'A' && c <= 'Z') ? char(c - 'A' + 'a') : c; };
-        if (lower(a[i]) != lower(b[i])) return false;
-    }
-    return true;
-}
-
-std::string_view trimmed(std::string_view s) {
-    constexpr std::string_view blanks = " \t\r\n";
-    const auto first = s.find_first_not_of(blanks);
-    if (first == std::string_view::npos) return {};
-    return s.substr(first, s.find_last_not_of(blanks) - first + 1);
-}
 
 // The cell as a number; an empty cell reads as 0. Configuration files may keep the Master flag
 // as "True"/"False".
@@ -43,9 +28,9 @@ double cellNumber(const PGCell& cell, int column) {
         double operator()(double v) const { return v; }
         double operator()(const std::string& text) const {
             if (column == Master) {
-                const auto t = trimmed(text);
-                if (equalsIgnoreCase(t, "True")) return kTrue;
-                if (equalsIgnoreCase(t, "False")) return kFalse;
+                const auto t = trim(text);
+                if (equalsIgnoringCase(t, "True")) return kTrue;
+                if (equalsIgnoringCase(t, "False")) return kFalse;
             }
             if (const auto v = parseNumber(text)) return *v;
             throw std::invalid_argument(std::string("'") + text + "' in column " +

@@ -3,35 +3,30 @@
 #include <algorithm>
 #include <array>
 #include <cctype>
+#include <span>
 #include <string_view>
 
 #include "core/numeric.h"
+#include "core/text.h"
 
 namespace zp {
 
 namespace {
 
-std::string upper(std::string_view s) {
-    std::string out(s);
-    std::transform(out.begin(), out.end(), out.begin(),
-                   [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
-    return out;
-}
-
 // Model and option codes are matched anywhere in the text, letter case ignored.
-bool containsCode(const std::string& upperText, std::string_view code) {
-    return upperText.find(code) != std::string::npos;
+bool containsAny(std::string_view text, std::span<const std::string_view> codes) {
+    return std::any_of(codes.begin(), codes.end(),
+                       [&](std::string_view c) { return containsIgnoringCase(text, c); });
 }
 
-bool containsAny(const std::string& upperText, std::initializer_list<std::string_view> codes) {
-    return std::any_of(codes.begin(), codes.end(),
-                       [&](std::string_view c) { return containsCode(upperText, c); });
+bool containsAny(std::string_view text, std::initializer_list<std::string_view> codes) {
+    return containsAny(text, std::span(codes.begin(), codes.size()));
 }
 
 void setCapabilities(PulsedModule& s, const AnalyzerIdentity& id) {
-    const std::string options = upper(id.optionText);
+    const std::string& options = id.optionText;
     if (!isListedModelText(id.modelText)) {
-        s.HasInternalGates = toBool16(containsCode(options, "J55"));
+        s.HasInternalGates = toBool16(containsIgnoringCase(options, "J55"));
         s.UseInternalGates = kUnchecked;
         return;
     }
@@ -100,8 +95,8 @@ void setRowLayout(PulsedModule& s) {
 
 }  // namespace
 
-bool isListedModelText(const std::string& modelText) {
-    return containsAny(upper(modelText), {"KT611", "KT622", "KT633", "KT644", "KT655"});
+bool isListedModelText(std::string_view modelText) {
+    return containsAny(modelText, kListedModelCodes);
 }
 
 void fillAtStartup(PulsedModule& state, const AnalyzerIdentity& identity) {

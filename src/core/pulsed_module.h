@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -126,8 +127,12 @@ struct PulsedModule {
 // gains and NeedsCalculation, in that order. Resets every other field to its start value first.
 void fillAtStartup(PulsedModule& state, const AnalyzerIdentity& identity);
 
+// The analyzer models the program knows by name; others get the generic receiver layout.
+inline constexpr std::string_view kListedModelCodes[] = {"KT611", "KT622", "KT633", "KT644",
+                                                         "KT655"};
+
 // True when the text contains one of the listed model codes (letter case ignored).
-bool isListedModelText(const std::string& modelText);
+bool isListedModelText(std::string_view modelText);
 
 // The one program-wide instance.
 PulsedModule& pulsedModule();

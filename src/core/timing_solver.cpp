@@ -8,6 +8,7 @@
 #include <utility>
 
 #include "core/numeric.h"
+#include "core/timing_limits.h"
 
 // Narrowband pulsed detection: the IF filter integrates over a whole number N of pulse periods,
 // which puts its nulls on the PRF harmonics so that only the carrier line is measured. The model
@@ -17,17 +18,13 @@ namespace zp {
 
 namespace {
 
-constexpr double kMinIFBW = 1.0;
-constexpr double kMaxIFBW = 10000.0;
-constexpr double kMinPRF = 0.001;
-constexpr double kMaxPRF = 165e6;
 constexpr double kMaxInt32 = std::numeric_limits<std::int32_t>::max();
 
 bool prfInRange(double prf) {
-    return std::isfinite(prf) && prf >= kMinPRF && prf <= kMaxPRF;
+    return std::isfinite(prf) && prf >= kPrfRangeHz.low && prf <= kPrfRangeHz.high;
 }
 bool ifbwInRange(double ifbw) {
-    return std::isfinite(ifbw) && ifbw >= kMinIFBW && ifbw <= kMaxIFBW;
+    return std::isfinite(ifbw) && ifbw >= kIfbwRangeHz.low && ifbw <= kIfbwRangeHz.high;
 }
 
 // Pulse periods per IF reading; the callers have checked prf and ifbw.

@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <utility>
 
+#include "core/timing_limits.h"
 #include "forms/main_form_layout.h"
 #include "instruments/analyzer_identity_query.h"
 #include "instruments/help_file_query.h"
@@ -67,14 +68,16 @@ void MainForm::declareControls() {
     const std::string params = "frm_PulsedParams";
     t.frame(frm_PulsedParams, {params, "Desired PRF and IFBW", kPulsedParamsFrame});
     t.label(lbl_prf, {"lbl_prf", "Pulse Repetition Frequency :", kPrfLabel}, params);
-    t.entry(VexoEdit_prf, {"VexoEdit_prf", 5000.0, 0.001, 165000000.0, 3, units::kHertz}, kPrfField,
-            params, [this] { runPrfRule(VexoEdit_prf.stepProperty() != 1); });
+    t.entry(VexoEdit_prf,
+            {"VexoEdit_prf", 5000.0, kPrfRangeHz.low, kPrfRangeHz.high, 3, units::kHertz},
+            kPrfField, params, [this] { runPrfRule(VexoEdit_prf.stepProperty() != 1); });
     t.label(lbl_pri, {"lbl_pri", "Pulse Repetition Interval :", kPriLabel}, params);
     t.entry(VexoEdit_pri, {"VexoEdit_pri", 0.0002, 3.4e-9, 1e18, 3, units::kSeconds}, kPriField,
             params, [this] { priRule(); });
     t.label(lbl_ifbw, {"lbl_ifbw", "Receiver IF Bandwidth :", kIfbwLabel}, params);
-    t.entry(VexoEdit_IFBW, {"VexoEdit_IFBW", 500.0, 1.0, 10000.0, 0, units::kHertz}, kIfbwField,
-            params, [this] { ifbwRule(); });
+    t.entry(VexoEdit_IFBW,
+            {"VexoEdit_IFBW", 500.0, kIfbwRangeHz.low, kIfbwRangeHz.high, 0, units::kHertz},
+            kIfbwField, params, [this] { ifbwRule(); });
     t.checkBox(chk_FixedPRF, {"chk_FixedPRF", "Fixed PRF", kFixedPrfBox}, kChecked, params,
                [this] { chk_FixedPRF_Click(); });
 

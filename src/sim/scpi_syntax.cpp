@@ -61,20 +61,6 @@ std::string errorEntry(ScpiErrorCode error) {
     return std::to_string(error.code) + ",\"" + error.text + "\"";
 }
 
-std::string trim(std::string_view text) {
-    std::size_t begin = 0;
-    std::size_t end = text.size();
-    while (begin < end && isBlank(text[begin])) ++begin;
-    while (end > begin && isBlank(text[end - 1])) --end;
-    return std::string(text.substr(begin, end - begin));
-}
-
-std::string upper(std::string_view text) {
-    std::string out(text);
-    for (char& c : out) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    return out;
-}
-
 bool matchesKeyword(std::string_view word, std::string_view keyword) {
     std::size_t shortLength = 0;
     while (shortLength < keyword.size() &&
@@ -123,8 +109,29 @@ ProgramHeader parseHeader(std::string_view header) {
     return result;
 }
 
+bool matchesPattern(std::span<const char* const> pattern, std::span<const HeaderNode> nodes,
+                    std::optional<int>& suffix) {
+    if (pattern.empty()) return nodes.empty();
+    std::string_view keyword = pattern.front();
+    const bool optional = keyword.front() == '[';
+    if (optional) keyword = keyword.substr(1, keyword.size() - 2);
+    const bool takesSuffix = keyword.back() == '#';
+    if (takesSuffix) keyword.remove_suffix(1);
+
+    if (optional && matchesPattern(pattern.subspan(1), nodes, suffix)) return true;
+    if (nodes.empty()) return false;
+    const HeaderNode& node = nodes.front();
+    if (!matchesKeyword(node.mnemonic, keyword)) return false;
+    if (node.suffix && !takesSuffix) return false;
+    const auto saved = suffix;
+    if (takesSuffix) suffix = node.suffix;
+    if (matchesPattern(pattern.subspan(1), nodes.subspan(1), suffix)) return true;
+    suffix = saved;
+    return false;
+}
+
 double parseNumber(std::string_view text, ScpiUnit unit) {
-    const std::string t = trim(text);
+    const std::string_view t = trim(text);
     if (t.empty()) throw ScpiFailure{kMissingParameter};
 
     // Mantissa and exponent are scanned here so that "1.5.3" or "E5" are syntax errors rather
@@ -156,7 +163,7 @@ double parseNumber(std::string_view text, ScpiUnit unit) {
 
     while (i < t.size() && isBlank(t[i])) ++i;
     if (i == t.size()) return value;
-    const std::string suffix = upper(std::string_view(t).substr(i));
+    const std::string suffix = upper(t.substr(i));
     for (char c : suffix) {
         if (!isAlpha(c)) throw ScpiFailure{kSyntaxError};
     }

@@ -1,11 +1,14 @@
 #pragma once
 // Lexical pieces of SCPI program messages shared by the simulated instruments: keyword matching,
-// header nodes, numbers with unit suffixes and the standard error entries.
+// header nodes, command patterns, numbers with unit suffixes and the standard errors.
 
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
+
+#include "core/text.h"
 
 namespace zp::sim {
 
@@ -14,14 +17,20 @@ struct ScpiErrorCode {
     const char* text;
 };
 
+// Command errors: the message cannot be read.
 inline constexpr ScpiErrorCode kSyntaxError{-102, "Syntax error"};
+inline constexpr ScpiErrorCode kDataTypeError{-104, "Data type error"};
 inline constexpr ScpiErrorCode kParameterNotAllowed{-108, "Parameter not allowed"};
 inline constexpr ScpiErrorCode kMissingParameter{-109, "Missing parameter"};
 inline constexpr ScpiErrorCode kUndefinedHeader{-113, "Undefined header"};
 inline constexpr ScpiErrorCode kHeaderSuffixOutOfRange{-114, "Header suffix out of range"};
 inline constexpr ScpiErrorCode kInvalidSuffix{-131, "Invalid suffix"};
+inline constexpr ScpiErrorCode kStringDataError{-150, "String data error"};
+// Execution errors: the message was read but cannot be carried out.
+inline constexpr ScpiErrorCode kSettingsConflict{-221, "Settings conflict"};
 inline constexpr ScpiErrorCode kDataOutOfRange{-222, "Data out of range"};
 inline constexpr ScpiErrorCode kIllegalParameterValue{-224, "Illegal parameter value"};
+// Device errors.
 inline constexpr ScpiErrorCode kQueueOverflow{-350, "Queue overflow"};
 
 // The queue entry text, e.g. -113,"Undefined header".
@@ -50,6 +59,12 @@ struct ProgramHeader {
 };
 ProgramHeader parseHeader(std::string_view header);
 
+// True when the nodes spell the command pattern, e.g. {"[SOURce]", "PULSe", "WIDTh#"}: a node in
+// brackets may be left out, and only a node marked "#" may carry a numeric suffix, which is stored
+// in `suffix` (left empty when not written).
+bool matchesPattern(std::span<const char* const> pattern, std::span<const HeaderNode> nodes,
+                    std::optional<int>& suffix);
+
 enum class ScpiUnit { none, second, hertz, volt, ohm };
 
 // Parses a decimal number in fixed or exponent form with an optional unit suffix of the given
@@ -59,8 +74,5 @@ double parseNumber(std::string_view text, ScpiUnit unit);
 
 // ON/OFF/1/0. Throws ScpiFailure (illegal parameter value) for anything else.
 bool parseBoolean(std::string_view text);
-
-std::string trim(std::string_view text);
-std::string upper(std::string_view text);
 
 }  // namespace zp::sim

@@ -1,54 +1,39 @@
 #pragma once
 // The simulated bench: one analyzer model, pulse generators at GPIB addresses, their wiring to the
-// analyzer, a pulsed device, injected faults and the I/O trace. The program's default back end.
+// analyzer, a pulsed device and injected faults. The program's default back end.
 
-#include <functional>
 #include <map>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "instruments/bench.h"
-#include "instruments/io_trace.h"
+#include "instruments/wired_bench.h"
 #include "sim/faults.h"
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
+#include "sim/sim_model.h"
 
 namespace zp::sim {
 
-struct SimModel {
-    std::string name;  // "kt622", ... as given on the command line
-    std::string modelText;
-    std::string optionText;
-    int ports = 2;
-    int sources = 1;
-    std::string hardwareValue;
-    double minFrequency = 10e6;
-    double maxFrequency = 26.5e9;
-};
-
-const std::vector<SimModel>& simModels();
-const SimModel* findSimModel(std::string_view name);  // nullptr when unknown
-inline constexpr const char* kDefaultModel = "kt622";
-
 class SimAnalyzerState;  // the analyzer's settings, shared by every connection
 
-class SimBench : public Bench {
+// The simulated instruments. The generators' outputs reach the analyzer's inputs, so the two are
+// built together; everything either does is written to the trace given, which must outlive them.
+class SimInstruments : public AnalyzerSource {
   public:
-    // Throws std::invalid_argument for an unknown model name (the message lists the known ones).
-    explicit SimBench(std::string_view modelName = kDefaultModel, SimFaults faults = {},
-                      std::vector<int> generatorAddresses = {11, 12, 13});
-    ~SimBench() override;
+    // Throws std::invalid_argument for an unknown model name (the message lists the known ones)
+    // and for generator addresses outside 0 to 30 or given twice.
+    explicit SimInstruments(IoTrace& trace, std::string_view modelName = kDefaultModel,
+                            SimFaults faults = {},
+                            std::vector<int> generatorAddresses = {11, 12, 13});
+    ~SimInstruments() override;
 
     std::unique_ptr<AnalyzerApplication> connectAnalyzer() override;
-    // Simulated generators unless a bus factory was set (real generators through a transport).
-    std::unique_ptr<InstrumentBus> createBus() override;
-    IoTrace* trace() override { return &trace_; }
     std::string describe() const override;
     bool simulated() const override { return true; }
 
-    void setBusFactory(std::function<std::unique_ptr<InstrumentBus>()> factory,
-                       std::string description);
+    // Buses to the simulated generators; these instruments must outlive the source.
+    std::unique_ptr<BusSource> generatorBus();
 
     const SimModel& model() const { return model_; }
     SimFaults& faults() { return faults_; }
@@ -58,11 +43,24 @@ class SimBench : public Bench {
   private:
     SimModel model_;
     SimFaults faults_;
-    IoTrace trace_;
+    IoTrace& trace_;
     std::map<int, std::unique_ptr<SimGenerator>> generators_;
     std::unique_ptr<SimAnalyzerState> analyzer_;
-    std::function<std::unique_ptr<InstrumentBus>()> busFactory_;
-    std::string busDescription_;
+};
+
+// The whole simulated bench: the simulated analyzer with its own simulated generators.
+class SimBench : public WiredBench {
+  public:
+    explicit SimBench(std::string_view modelName = kDefaultModel, SimFaults faults = {},
+                      std::vector<int> generatorAddresses = {11, 12, 13});
+
+    const SimModel& model() const { return instruments_->model(); }
+    SimFaults& faults() { return instruments_->faults(); }
+    SimGenerator* generator(int address) { return instruments_->generator(address); }
+    SimAnalyzerState& analyzer() { return instruments_->analyzer(); }
+
+  private:
+    SimInstruments* instruments_;  // owned by the wiring
 };
 
 }  // namespace zp::sim

@@ -7,6 +7,8 @@
 #include <optional>
 #include <vector>
 
+#include "core/text.h"
+
 namespace zp::transport {
 
 namespace {
@@ -21,12 +23,6 @@ constexpr const char* kForms =
 
 std::string quoted(std::string_view text) {
     return "\"" + std::string(text) + "\"";
-}
-
-std::string upper(std::string_view text) {
-    std::string out(text);
-    for (char& c : out) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    return out;
 }
 
 bool isDigit(char c) {

@@ -5,6 +5,7 @@
 #include <stdexcept>
 #include <vector>
 
+#include "core/text.h"
 #include "instruments/io_trace.h"
 #include "instruments/tracing_bus.h"
 #include "transport/resource.h"
@@ -60,12 +61,6 @@ std::vector<std::string> splitEntries(std::string_view text) {
     return entries;
 }
 
-std::string trimmed(std::string_view text) {
-    while (!text.empty() && isBlank(text.front())) text.remove_prefix(1);
-    while (!text.empty() && isBlank(text.back())) text.remove_suffix(1);
-    return std::string(text);
-}
-
 // Stray commas around an entry ("11=..., ,") are separators, not part of it.
 std::string withoutCommas(std::string_view text) {
     while (!text.empty() && text.front() == ',') text.remove_prefix(1);
@@ -78,15 +73,15 @@ std::string withoutCommas(std::string_view text) {
 BusResources parseBusResources(std::string_view text) {
     BusResources resources;
     for (const std::string& entry : splitEntries(text)) {
-        const std::string e = withoutCommas(trimmed(entry));
+        const std::string e = withoutCommas(trim(entry, kWhitespace));
         if (e.empty()) continue;
         const std::size_t eq = e.find('=');
         if (eq == std::string::npos) {
             throw std::invalid_argument(
                 "Bus entry \"" + e + "\" is not ADDRESS=RESOURCE (for example " + kExample + ")");
         }
-        const std::string addressText = trimmed(std::string_view(e).substr(0, eq));
-        const std::string resource = trimmed(std::string_view(e).substr(eq + 1));
+        const std::string addressText(trim(std::string_view(e).substr(0, eq), kWhitespace));
+        const std::string resource(trim(std::string_view(e).substr(eq + 1), kWhitespace));
         int address = -1;
         const auto [end, ec] =
             std::from_chars(addressText.data(), addressText.data() + addressText.size(), address);

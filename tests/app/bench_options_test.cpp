@@ -4,6 +4,8 @@
 #include <sstream>
 
 #include "common/bench_options.h"
+#include "common/bench_wiring.h"
+#include "common/cli_actions.h"
 
 namespace zp::app {
 namespace {
@@ -82,10 +84,8 @@ TEST(BenchOptions, TheWindowProgramTakesNoActionsButAScreenshotFile) {
 TEST(BenchOptions, MakesTheBenchItDescribes) {
     BenchOptions o;
     o.model = "kt655";
-    o.faults = {"noidn:11"};
-    auto bench = makeBench(o);
-    EXPECT_EQ(bench->model().name, "kt655");
-    EXPECT_EQ(bench->faults().silentGenerators.count(11), 1u);
+    EXPECT_EQ(makeBench(o)->describe(),
+              "simulated KT655A (kt655), simulated generators at 11, 12, 13");
 
     o.traceFile = "/nonexistent-dir/trace.log";
     EXPECT_THROW(makeBench(o), std::exception);
@@ -122,8 +122,30 @@ TEST(BenchOptions, EarlyExitsAnswerHelpVersionModelsAndUsageErrors) {
     const std::string models = modelListText();
     EXPECT_NE(models.find("kt655\tKT655A\tK71 M83 M84\t4\t3\n"), std::string::npos) << models;
     EXPECT_NE(models.find("kt611\tKT611A\t-\t2\t1\n"), std::string::npos) << models;
-    EXPECT_NE(usageText(Program::Cli).find("calculate"), std::string::npos);
     EXPECT_EQ(usageText(Program::Gui).find("calculate"), std::string::npos);
+}
+
+TEST(BenchOptions, TheActionHelpComesFromTheActionTable) {
+    const std::string usage = usageText(Program::Cli);
+    const std::string actions = usage.substr(usage.find("\nActions"));
+    EXPECT_EQ(actions.substr(actions.find("  step")),
+              "  step FIELD [ROW] up|down    one step of the field, as the arrow keys do\n"
+              "  calculate                   solve the timing\n"
+              "  show                        print the main window state as JSON\n"
+              "  help                        print the help file the analyzer reports\n"
+              "\nExit status: 0 success, 1 failure, 2 bad command line.\n");
+    // A usage too long for the column has its help below it.
+    const std::string indent(30, ' ');
+    EXPECT_NE(actions.find("\n  set FIELD [ROW] VALUE | set TOGGLE on|off\n" + indent +
+                           "type VALUE into a field, or set a toggle\n" + indent +
+                           "FIELD: prf|pri|ifbw|width ROW|delay ROW\n" + indent +
+                           "TOGGLE: fixedprf|converter|nopg|noswgating|pulsed\n" + indent +
+                           "VALUE: a number with a unit, e.g. 10k, 200us\n  step"),
+              std::string::npos)
+        << actions;
+    for (const ActionKind& kind : actionTable()) {
+        EXPECT_NE(actions.find("\n  " + kind.usage), std::string::npos) << kind.name;
+    }
 }
 
 TEST(BenchOptions, HelpListsEveryOptionOfItsProgram) {

@@ -5,7 +5,7 @@
 
 #include "fuzz_check.h"
 #include "instruments/instrument_error.h"
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     if (size == 0) return 0;

@@ -3,7 +3,7 @@
 #include <cmath>
 
 #include "fuzz_check.h"
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
 
 namespace {
 

@@ -6,7 +6,7 @@
 #include <string>
 
 #include "instruments/apply_support.h"
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
 
 namespace zp {
 namespace {

@@ -7,7 +7,7 @@
 
 #include "instruments/apply_support.h"
 #include "instruments/probe_bench.h"
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
 
 namespace zp {
 namespace {

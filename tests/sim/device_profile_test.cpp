@@ -8,9 +8,9 @@
 #include <vector>
 
 #include "core/numeric.h"
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
+#include "sim/generators/wiring.h"
 #include "sim/sim_bench.h"
-#include "sim/wiring.h"
 
 namespace zp::sim {
 namespace {

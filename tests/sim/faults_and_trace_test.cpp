@@ -3,7 +3,7 @@
 #include "instruments/error_capture.h"
 #include "instruments/instrument_bus.h"
 #include "instruments/instrument_error.h"
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
 #include "sim/sim_bench.h"
 
 namespace zp::sim {

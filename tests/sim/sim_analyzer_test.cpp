@@ -8,7 +8,7 @@
 
 #include "instruments/error_capture.h"
 #include "instruments/instrument_error.h"
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
 #include "sim/sim_bench.h"
 
 namespace zp::sim {
@@ -42,9 +42,7 @@ TEST(SimModelsTest, TableIsExactlyTheListedModels) {
 TEST(SimBenchTest, DescribesItselfAndRejectsUnknownModels) {
     EXPECT_EQ(SimBench().describe(),
               "simulated KT622A (kt622), simulated generators at 11, 12, 13");
-    SimBench bench("zx20-j55");
-    bench.setBusFactory([] { return std::unique_ptr<InstrumentBus>(); }, "generators over LAN");
-    EXPECT_EQ(bench.describe(), "simulated ZX20 (zx20-j55), generators over LAN");
+    EXPECT_EQ(SimBench("zx20-j55", {}, {}).describe(), "simulated ZX20 (zx20-j55), no generators");
     try {
         SimBench bad("x");
         FAIL() << "accepted an unknown model";
@@ -99,6 +97,12 @@ TEST_F(SimAnalyzerTest, BadCommandsRaiseScpiErrorsAndChangeNothing) {
         {"SENS1:SWE:SRCP 3", "-222 Data out of range"},
         {"SENS1:SWE:SRCP x", "-104 Data type error"},
         {"CALC1:PAR:SEL 'open", "-150 String data error"},
+        // A query-only command sent as a setting, a suffix on a node that takes none, a common
+        // command the analyzer lacks and a node that is no keyword.
+        {"CALC1:PAR:CAT", "-113 Undefined header"},
+        {"CALC1:PAR2:CAT?", "-113 Undefined header"},
+        {"*RST", "-113 Undefined header"},
+        {"CALC1:PAR:C-T?", "-113 Undefined header"},
     };
     for (const auto& [command, error] : cases) {
         long number = 0;
@@ -108,6 +112,11 @@ TEST_F(SimAnalyzerTest, BadCommandsRaiseScpiErrorsAndChangeNothing) {
     EXPECT_EQ(parse("CALC1:PAR:CAT?"), "\"CH1_S11_1,S11\"\n") << "nothing changed";
     // Long forms and lower case are the same commands.
     EXPECT_EQ(parse("calculate1:parameter:catalog?"), "\"CH1_S11_1,S11\"\n");
+    // The channel defaults to 1; STATe may be left out.
+    EXPECT_EQ(parse(":CALC:PAR:CAT?"), "\"CH1_S11_1,S11\"\n");
+    EXPECT_EQ(parse("SENS:CORR:STAT OFF"), "");
+    EXPECT_EQ(parse("SENS1:CORR?"), "0\n");
+    EXPECT_EQ(parse("*idn?"), "Korvex,KT622A,SIM000001,A.01.00\n");
 }
 
 TEST_F(SimAnalyzerTest, HelpFileIsTheQuotedManualPathWithLineFeed) {

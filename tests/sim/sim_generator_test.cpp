@@ -1,4 +1,4 @@
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "sim/sim_gpib_bus.h"
+#include "sim/generators/sim_gpib_bus.h"
 
 #include <gtest/gtest.h>
 

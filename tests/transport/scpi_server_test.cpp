@@ -1,4 +1,4 @@
-#include "sim/scpi_server.h"
+#include "sim/server/scpi_server.h"
 
 #include <gtest/gtest.h>
 

@@ -6,8 +6,8 @@
 #include <memory>
 #include <string>
 
-#include "sim/scpi_server.h"
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
+#include "sim/server/scpi_server.h"
 #include "transport/raw_socket_link.h"
 
 namespace zp::testing {

@@ -23,7 +23,7 @@
 #include <string>
 
 #include "instruments/instrument_bus.h"
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
 
 namespace zp {
 class IoTrace;

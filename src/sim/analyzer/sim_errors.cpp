@@ -1,4 +1,4 @@
-#include "sim/sim_errors.h"
+#include "sim/analyzer/sim_errors.h"
 
 #include <cstdlib>
 
@@ -8,6 +8,10 @@ InstrumentError analyzerError(std::string description) {
     char* end = nullptr;
     const long number = std::strtol(description.c_str(), &end, 10);
     return InstrumentError(end == description.c_str() ? 1 : number, std::move(description));
+}
+
+InstrumentError analyzerError(ScpiErrorCode error) {
+    return InstrumentError(error.code, std::to_string(error.code) + " " + error.text);
 }
 
 }  // namespace zp::sim

@@ -7,8 +7,8 @@
 #include <string_view>
 #include <vector>
 
-#include "sim/device_model.h"
-#include "sim/sim_generator.h"
+#include "sim/generators/device_model.h"
+#include "sim/generators/sim_generator.h"
 
 namespace zp::sim {
 

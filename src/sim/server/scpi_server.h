@@ -20,7 +20,7 @@
 #include <string_view>
 #include <thread>
 
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
 
 namespace zp::sim {
 

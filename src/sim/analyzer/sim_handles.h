@@ -6,7 +6,7 @@
 #include <string>
 
 #include "instruments/analyzer_automation.h"
-#include "sim/sim_call.h"
+#include "sim/analyzer/sim_call.h"
 
 namespace zp::sim {
 
@@ -24,7 +24,7 @@ class SimHandle {
     // missing channel is reported ahead of a bad value.
     template <class Value, class Find>
     void store(std::string_view operation, const Value& value, bool valid, Find&& find,
-               const char* refusal = kDataOutOfRange) {
+               ScpiErrorCode refusal = kDataOutOfRange) {
         call(operation, trace_text::args(value), [&] {
             auto* slot = find();
             if (!valid) throw analyzerError(refusal);

@@ -1,6 +1,6 @@
 #include <cmath>
 
-#include "sim/sim_handles.h"
+#include "sim/analyzer/sim_handles.h"
 
 namespace zp::sim {
 
@@ -8,8 +8,8 @@ namespace {
 
 using trace_text::args;
 
-void require(bool ok, const char* description = kDataOutOfRange) {
-    if (!ok) throw analyzerError(description);
+void require(bool ok, ScpiErrorCode error = kDataOutOfRange) {
+    if (!ok) throw analyzerError(error);
 }
 
 class SimChannelHandle final : public Channel, SimHandle {

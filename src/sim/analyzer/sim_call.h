@@ -11,8 +11,8 @@
 
 #include "core/numeric.h"
 #include "instruments/io_trace.h"
-#include "sim/sim_analyzer_state.h"
-#include "sim/sim_errors.h"
+#include "sim/analyzer/sim_analyzer_state.h"
+#include "sim/analyzer/sim_errors.h"
 
 namespace zp::sim::trace_text {
 

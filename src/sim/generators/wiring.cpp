@@ -1,4 +1,4 @@
-#include "sim/wiring.h"
+#include "sim/generators/wiring.h"
 
 #include <stdexcept>
 

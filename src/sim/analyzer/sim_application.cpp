@@ -1,7 +1,7 @@
 // The application object and its small companions: channel collection, capabilities, message
 // area, command parser and the active measurement.
 
-#include "sim/sim_handles.h"
+#include "sim/analyzer/sim_handles.h"
 
 namespace zp::sim {
 

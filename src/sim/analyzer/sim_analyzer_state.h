@@ -11,10 +11,12 @@
 #include <string_view>
 #include <vector>
 
-#include "sim/device_model.h"
-#include "sim/sim_bench.h"
-#include "sim/sim_channel_state.h"
-#include "sim/wiring.h"
+#include "instruments/io_trace.h"
+#include "sim/analyzer/sim_channel_state.h"
+#include "sim/faults.h"
+#include "sim/generators/device_model.h"
+#include "sim/generators/wiring.h"
+#include "sim/sim_model.h"
 
 namespace zp::sim {
 

@@ -1,11 +1,11 @@
-#include "sim/sim_analyzer_state.h"
+#include "sim/analyzer/sim_analyzer_state.h"
 
 #include <algorithm>
-#include <cctype>
 #include <cmath>
 #include <filesystem>
 
-#include "sim/sim_errors.h"
+#include "core/pulsed_module.h"
+#include "sim/analyzer/sim_errors.h"
 
 namespace zp::sim {
 
@@ -15,15 +15,6 @@ constexpr int kMaxChannel = 200;
 constexpr int kMaxPoints = 32001;
 
 bool contains(const std::string& text, std::string_view part) {
-    return text.find(part) != std::string::npos;
-}
-
-bool containsIgnoringCase(std::string text, std::string part) {
-    const auto upper = [](std::string& s) {
-        for (auto& c : s) c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    };
-    upper(text);
-    upper(part);
     return text.find(part) != std::string::npos;
 }
 
@@ -44,10 +35,7 @@ SimAnalyzerState::SimAnalyzerState(SimModel model, SimFaults* faults, IoTrace* t
 }
 
 bool SimAnalyzerState::isListedModel() const {
-    for (const char* code : {"KT611", "KT622", "KT633", "KT644", "KT655"}) {
-        if (containsIgnoringCase(model_.modelText, code)) return true;
-    }
-    return false;
+    return isListedModelText(model_.modelText);
 }
 
 bool SimAnalyzerState::hasSourceModulator(int source) const {
@@ -104,7 +92,7 @@ SimChannel SimAnalyzerState::makeChannel(int number) const {
 
 SimChannel& SimAnalyzerState::channel(int number) {
     SimChannel* found = findChannel(number);
-    if (found == nullptr) throw analyzerError(kSuffixOutOfRange);
+    if (found == nullptr) throw analyzerError(kHeaderSuffixOutOfRange);
     return *found;
 }
 
@@ -120,7 +108,7 @@ std::vector<int> SimAnalyzerState::channelNumbers() const {
 }
 
 void SimAnalyzerState::copyChannel(int from, int to) {
-    if (to < 1 || to > kMaxChannel) throw analyzerError(kSuffixOutOfRange);
+    if (to < 1 || to > kMaxChannel) throw analyzerError(kHeaderSuffixOutOfRange);
     SimChannel copy = channel(from);
     copy.number = to;
     copy.inSetup = false;

@@ -1,6 +1,4 @@
-#include <vector>
-
-#include "sim/sim_bench.h"
+#include "sim/sim_model.h"
 
 namespace zp::sim {
 

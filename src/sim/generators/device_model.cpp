@@ -1,4 +1,4 @@
-#include "sim/device_model.h"
+#include "sim/generators/device_model.h"
 
 #include <algorithm>
 #include <cmath>

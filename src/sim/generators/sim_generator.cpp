@@ -1,9 +1,8 @@
-#include "sim/sim_generator.h"
+#include "sim/generators/sim_generator.h"
 
 #include <array>
 #include <cctype>
 #include <cstdio>
-#include <span>
 #include <utility>
 #include <vector>
 
@@ -14,7 +13,6 @@ namespace zp::sim {
 namespace {
 
 constexpr std::size_t kErrorQueueCapacity = 30;
-constexpr ScpiErrorCode kSettingsConflictCode{-221, "Settings conflict"};
 constexpr const char* kNoError = "+0,\"No error\"";
 
 constexpr double kMinFrequency = 1e-3;
@@ -67,7 +65,7 @@ std::string shortForm(std::string_view mnemonic) {
 // INT2), or fails with -224.
 std::string enumeration(const std::string& param,
                         std::initializer_list<std::string_view> keywords) {
-    const std::string word = trim(param);
+    const std::string word(trim(param));
     const auto digitsOf = [](std::string_view text) {
         std::size_t i = text.size();
         while (i > 0 && std::isdigit(static_cast<unsigned char>(text[i - 1])) != 0) --i;
@@ -173,7 +171,7 @@ void frequency(Context& c) {
     const double period = 1.0 / c.state.frequency;
     for (const auto& output : c.state.outputs) {
         if (output.width > period) {
-            c.generator.pushError(errorEntry(kSettingsConflictCode));
+            c.generator.pushError(errorEntry(kSettingsConflict));
             return;
         }
     }
@@ -224,7 +222,7 @@ void display(Context& c) {
     onOff(c, c.state.displayOn);
 }
 
-// A pattern node: "[...]" is optional, a trailing "#" takes the output suffix 1 or 2.
+// The pattern's "#" node takes the output suffix 1 or 2.
 struct CommandSpec {
     std::vector<const char*> pattern;
     void (*action)(Context&);
@@ -252,36 +250,15 @@ const std::vector<CommandSpec>& commandTable() {
     return table;
 }
 
-bool matchPattern(std::span<const char* const> pattern, std::span<const HeaderNode> nodes,
-                  std::optional<int>& suffix) {
-    if (pattern.empty()) return nodes.empty();
-    std::string_view keyword = pattern.front();
-    const bool optional = keyword.front() == '[';
-    if (optional) keyword = keyword.substr(1, keyword.size() - 2);
-    const bool takesSuffix = keyword.back() == '#';
-    if (takesSuffix) keyword.remove_suffix(1);
-
-    if (optional && matchPattern(pattern.subspan(1), nodes, suffix)) return true;
-    if (nodes.empty()) return false;
-    const HeaderNode& node = nodes.front();
-    if (!matchesKeyword(node.mnemonic, keyword)) return false;
-    if (node.suffix && !takesSuffix) return false;
-    const auto saved = suffix;
-    if (takesSuffix) suffix = node.suffix;
-    if (matchPattern(pattern.subspan(1), nodes.subspan(1), suffix)) return true;
-    suffix = saved;
-    return false;
-}
-
 std::vector<std::string> splitParameters(std::string_view text) {
     std::vector<std::string> params;
-    const std::string all = trim(text);
+    const std::string all(trim(text));
     if (all.empty()) return params;
     std::size_t pos = 0;
     while (true) {
         const std::size_t comma = all.find(',', pos);
-        std::string param = trim(std::string_view(all).substr(
-            pos, comma == std::string::npos ? std::string::npos : comma - pos));
+        std::string param(trim(std::string_view(all).substr(
+            pos, comma == std::string::npos ? std::string::npos : comma - pos)));
         if (param.empty()) throw ScpiFailure{kSyntaxError};
         params.push_back(std::move(param));
         if (comma == std::string::npos) break;
@@ -336,7 +313,7 @@ void SimGenerator::preset() {
 std::optional<std::string> SimGenerator::handle(std::string_view line) {
     std::vector<std::string> replies;
     for (std::string_view unit : splitMessage(line)) {
-        const std::string text = trim(unit);
+        const std::string text(trim(unit));
         if (text.empty()) continue;
         try {
             std::size_t blank = 0;
@@ -367,7 +344,7 @@ std::optional<std::string> SimGenerator::handle(std::string_view line) {
                 std::optional<int> suffix;
                 for (const auto& entry : commandTable()) {
                     suffix.reset();
-                    if (matchPattern(entry.pattern, parsed.nodes, suffix)) {
+                    if (matchesPattern(entry.pattern, parsed.nodes, suffix)) {
                         found = &entry;
                         break;
                     }

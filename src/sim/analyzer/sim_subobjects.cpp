@@ -5,7 +5,7 @@
 #include <cctype>
 #include <cmath>
 
-#include "sim/sim_handles.h"
+#include "sim/analyzer/sim_handles.h"
 
 namespace zp::sim {
 
@@ -13,8 +13,8 @@ namespace {
 
 using trace_text::args;
 
-void require(bool ok, const char* description = kDataOutOfRange) {
-    if (!ok) throw analyzerError(description);
+void require(bool ok, ScpiErrorCode error = kDataOutOfRange) {
+    if (!ok) throw analyzerError(error);
 }
 
 bool isReceiver(const std::string& name, int ports) {
@@ -54,14 +54,15 @@ class SimIfConfigurationHandle final : public IfConfiguration, SimHandle {
     void setReceiverSwitch(const std::string& selector, bool on) override {
         call("setReceiverSwitch", args(selector, on), [&] {
             auto& c = cfg();
-            require(selector == "ALL" || isReceiver(selector, state_.model().ports), kIllegalValue);
+            require(selector == "ALL" || isReceiver(selector, state_.model().ports),
+                    kIllegalParameterValue);
             c.receiverSwitch[selector] = on;
         });
     }
     void setReceiverGain(const std::string& receiver, int gainState) override {
         call("setReceiverGain", args(receiver, gainState), [&] {
             auto& c = cfg();
-            require(isReceiver(receiver, state_.model().ports), kIllegalValue);
+            require(isReceiver(receiver, state_.model().ports), kIllegalParameterValue);
             require(gainState >= 0 && gainState <= 3);
             c.receiverGain[receiver] = gainState;
         });
@@ -106,7 +107,7 @@ class SimPathElementHandle final : public PathElement, SimHandle {
     void setValue(const std::string& value) override {
         call("setValue", args(value), [&] {
             std::string& slot = element();
-            require(acceptsValue(name_, value), kIllegalValue);
+            require(acceptsValue(name_, value), kIllegalParameterValue);
             slot = value;
         });
     }
@@ -118,7 +119,7 @@ class SimPathElementHandle final : public PathElement, SimHandle {
     std::string& element() {
         auto& elements = state_.channel(channel_).pathElements;
         const auto it = elements.find(name_);
-        if (it == elements.end()) throw analyzerError(kIllegalValue);
+        if (it == elements.end()) throw analyzerError(kIllegalParameterValue);
         return it->second;
     }
     int channel_;
@@ -133,7 +134,7 @@ class SimPathConfigurationHandle final : public PathConfiguration, SimHandle {
     std::unique_ptr<PathElement> element(const std::string& name) override {
         return call("element", args(name), [&]() -> std::unique_ptr<PathElement> {
             const auto& elements = state_.channel(channel_).pathElements;
-            if (elements.find(name) == elements.end()) throw analyzerError(kIllegalValue);
+            if (elements.find(name) == elements.end()) throw analyzerError(kIllegalParameterValue);
             return std::make_unique<SimPathElementHandle>(state_, channel_, name);
         });
     }
@@ -215,13 +216,13 @@ class SimProcessingModuleHandle final : public SignalProcessingModule, SimHandle
     void setFilterType(const std::string& type) override {
         store(
             "setFilterType", type, type == "RECT" || type == "PWIN",
-            [&] { return &module().filterType; }, kIllegalValue);
+            [&] { return &module().filterType; }, kIllegalParameterValue);
     }
     void setFilterParameter(const std::string& name, double value) override {
         call("setFilterParameter", args(name, value), [&] {
             auto& m = module();
             require(name.size() == 1 && std::isupper(static_cast<unsigned char>(name[0])),
-                    kIllegalValue);
+                    kIllegalParameterValue);
             require(std::isfinite(value));
             m.filterParameters[name] = value;
         });

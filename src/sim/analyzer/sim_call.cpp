@@ -1,4 +1,4 @@
-#include "sim/sim_call.h"
+#include "sim/analyzer/sim_call.h"
 
 namespace zp::sim {
 

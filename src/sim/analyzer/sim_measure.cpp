@@ -3,9 +3,9 @@
 
 #include <optional>
 
-#include "sim/sim_analyzer_state.h"
-#include "sim/sim_errors.h"
-#include "sim/sim_generator.h"
+#include "sim/analyzer/sim_analyzer_state.h"
+#include "sim/analyzer/sim_errors.h"
+#include "sim/generators/sim_generator.h"
 
 namespace zp::sim {
 
@@ -65,7 +65,7 @@ bool isMeasurableParameter(std::string_view parameter, int ports) {
 std::complex<double> SimAnalyzerState::measure(const SimChannel& ch, const std::string& parameter,
                                                int point) const {
     const auto p = parseParameter(parameter, model_.ports);
-    if (!p) throw analyzerError(kIllegalValue);
+    if (!p) throw analyzerError(kIllegalParameterValue);
     const int sourcePort = p->kind == Kind::SParameter ? p->sourcePort : ch.sourcePort;
     const PulseWindow source = signalOf(ch, Wiring::kSourceElement, 0, point, generators_, wiring_);
 

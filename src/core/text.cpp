@@ -1,0 +1,44 @@
+#include "core/text.h"
+
+#include <algorithm>
+
+namespace zp {
+
+std::string_view trim(std::string_view text, std::string_view blanks) {
+    const std::size_t first = text.find_first_not_of(blanks);
+    if (first == std::string_view::npos) return {};
+    return text.substr(first, text.find_last_not_of(blanks) - first + 1);
+}
+
+char upper(char c) {
+    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
+}
+
+char lower(char c) {
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+
+std::string upper(std::string_view text) {
+    std::string out(text);
+    for (char& c : out) c = upper(c);
+    return out;
+}
+
+std::string lower(std::string_view text) {
+    std::string out(text);
+    for (char& c : out) c = lower(c);
+    return out;
+}
+
+bool equalsIgnoringCase(std::string_view a, std::string_view b) {
+    return a.size() == b.size() && std::equal(a.begin(), a.end(), b.begin(),
+                                              [](char x, char y) { return lower(x) == lower(y); });
+}
+
+bool containsIgnoringCase(std::string_view text, std::string_view part) {
+    const auto it = std::search(text.begin(), text.end(), part.begin(), part.end(),
+                                [](char x, char y) { return lower(x) == lower(y); });
+    return it != text.end() || part.empty();
+}
+
+}  // namespace zp
