@@ -29,6 +29,7 @@ class CliFrontEnd : public FrontEnd {
             return kUsageExit;
         }
         ui_ = std::make_unique<ConsoleInteraction>(std::cout, cmd.options.yes);
+        keepGoing_ = cmd.options.keepGoing;
         return std::nullopt;
     }
 
@@ -42,7 +43,7 @@ class CliFrontEnd : public FrontEnd {
     }
 
     int run(zp::MainForm& form, zp::Bench& bench) override {
-        ActionContext ctx{form, *ui_, std::cout, bench.trace()};
+        ActionContext ctx{form, *ui_, std::cout, bench.trace(), keepGoing_};
         if (const std::string lost = lostOutput(ctx); !lost.empty()) {
             std::cerr << "zentra-pulse-cli: start-up: " << lost << '\n';
             return 1;
@@ -53,6 +54,7 @@ class CliFrontEnd : public FrontEnd {
   private:
     std::vector<Action> actions_;
     std::unique_ptr<ConsoleInteraction> ui_;
+    bool keepGoing_ = false;
 };
 
 }  // namespace

@@ -100,6 +100,10 @@ ParsedCommandLine parseCommandLine(const std::vector<std::string>& args, Program
             o.yes = true;
             continue;
         }
+        if (program == Program::Cli && arg == "--keep-going") {
+            o.keepGoing = true;
+            continue;
+        }
         struct Named {
             const char* name;
             bool gui;
@@ -193,13 +197,18 @@ std::string usageText(Program program) {
            "  --trace-io FILE       write every analyzer call and bus text to FILE\n"
            "  --fault FAULT         make the simulated bench fail (repeatable): analyzer:OP=TEXT,\n"
            "                        noidn:ADDR, generror:ADDR=ENTRY, timeout:ADDR, baddata\n";
-    if (cli) out << "  --yes, -y             answer yes to every question\n";
+    if (cli) {
+        out << "  --yes, -y             answer yes to every question\n"
+               "  --keep-going          run every action: a failed one prints its reason and\n"
+               "                        the rest still run (the exit status is still 1)\n";
+    }
     if (!cli)
         out << "  --screenshot FILE     start unattended, save the window as PNG FILE, exit\n";
     out << "  --help, -h            show this help and exit\n"
            "  --version             show the version and exit\n";
     if (cli) {
-        out << "\nActions (run in order; the first failure ends the run with status 1):\n";
+        out << "\nActions (run in order; the first failure ends the run with status 1,\n"
+               "unless --keep-going):\n";
         printActionHelp(out);
     }
     out << "\nExit status: 0 success, 1 failure, 2 bad command line.\n";

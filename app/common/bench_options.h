@@ -23,6 +23,7 @@ struct BenchOptions {
     bool version = false;
     // zentra-pulse-cli only.
     bool yes = false;
+    bool keepGoing = false;  // a failed action does not end the run
     // zentra-pulse only: render the main window to this PNG after start-up and end.
     std::optional<std::string> screenshot;
 };

@@ -6,6 +6,7 @@
 
 #include "core/numeric.h"
 #include "forms/main_form_json.h"
+#include "instruments/apply/apply_types.h"
 #include "instruments/instrument_error.h"
 
 namespace zp::app {
@@ -188,6 +189,27 @@ Action parseCalculate(WordCursor&) {
     });
 }
 
+// "SPulsedModeOn, generator rows programmed: 5": the procedure, and on the external path how many
+// generator rows got through to their error check.
+std::string applyEcho(const ApplyResult& result) {
+    std::string echo = procedureName(result.procedure);
+    if (result.procedure == ApplyProcedure::PulsedModeOn) {
+        echo += ", generator rows programmed: " + std::to_string(result.generatorRows);
+    } else if (result.procedure == ApplyProcedure::PulsedModeOff) {
+        echo += ", generator rows switched off: " + std::to_string(result.generatorRows);
+    }
+    return echo;
+}
+
+Action parseApply(WordCursor&) {
+    return plainAction("apply", [](ActionContext& ctx) {
+        refuseIf(ctx.form.controls().click("b_apply"));
+        // A failure has shown its message, which fails the action before this echo is printed.
+        if (!ctx.form.lastApply()) throw ActionError("Apply did not run");
+        return "apply -> " + applyEcho(*ctx.form.lastApply());
+    });
+}
+
 Action parseShow(WordCursor&) {
     return plainAction("show", [](ActionContext& ctx) {
         ctx.out << mainFormJson(ctx.form) << '\n';
@@ -223,6 +245,7 @@ const std::vector<ActionKind>& actionTable() {
         {"step", "step FIELD [ROW] up|down", parseStep,
          "one step of the field, as the arrow keys do"},
         {"calculate", "calculate", parseCalculate, "solve the timing"},
+        {"apply", "apply", parseApply, "put the setup onto the instruments (or off)"},
         {"show", "show", parseShow, "print the main window state as JSON"},
         {"help", "help", parseHelp, "print the help file the analyzer reports"},
     };
@@ -249,6 +272,7 @@ std::vector<Action> parseActions(const std::vector<std::string>& words) {
 }
 
 int runActions(const std::vector<Action>& actions, ActionContext& ctx, std::ostream& err) {
+    int status = 0;
     for (const Action& action : actions) {
         std::string failure;
         std::string echo;
@@ -265,15 +289,21 @@ int runActions(const std::vector<Action>& actions, ActionContext& ctx, std::ostr
             for (const std::string& m : messages) failure += (failure.empty() ? "" : "; ") + m;
         }
         if (failure.empty() && !echo.empty()) ctx.out << echo << '\n';
-        if (failure.empty()) failure = lostOutput(ctx);
+        bool lost = false;
+        if (failure.empty()) {
+            failure = lostOutput(ctx);
+            lost = !failure.empty();
+        }
         if (!failure.empty()) {
             ctx.out.flush();
             err << "zentra-pulse-cli: " << action.words << ": "
                 << ConsoleInteraction::oneLine(failure) << '\n';
-            return 1;
+            status = 1;
+            // Lost output would stay lost for every later action.
+            if (!ctx.keepGoing || lost) return status;
         }
     }
-    return 0;
+    return status;
 }
 
 std::string lostOutput(ActionContext& ctx) {

@@ -25,6 +25,7 @@ struct ActionContext {
     ConsoleInteraction& ui;
     std::ostream& out;
     const IoTrace* trace = nullptr;  // the bench's, when its file must keep up
+    bool keepGoing = false;          // a failed action does not end the run
 };
 
 // One parsed action, ready to run.
@@ -63,9 +64,10 @@ const std::vector<ActionKind>& actionTable();
 // Parses every action before any runs, so that a typing error costs nothing.
 std::vector<Action> parseActions(const std::vector<std::string>& words);
 
-// Runs the actions in order and echoes each on `ctx.out`. The first failure is printed on `err`
-// as "zentra-pulse-cli: <action>: <reason>" (one line) and ends the run; returns the exit status
-// (0 or 1). Output that cannot be written is a failure of the action that wrote it.
+// Runs the actions in order and echoes each on `ctx.out`. A failure is printed on `err` as
+// "zentra-pulse-cli: <action>: <reason>" (one line) and ends the run, unless `ctx.keepGoing`;
+// returns the exit status (0, or 1 after any failure). Output that cannot be written is a failure
+// of the action that wrote it, and ends the run always.
 int runActions(const std::vector<Action>& actions, ActionContext& ctx, std::ostream& err);
 
 // Why the run's output is lost, empty while it is not: `ctx.out` (flushed to find out) or the

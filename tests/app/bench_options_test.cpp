@@ -29,13 +29,15 @@ TEST(BenchOptions, DefaultsToTheSimulatedKt622WithSimulatedGenerators) {
 TEST(BenchOptions, ReadsEveryOptionInBothSpellings) {
     ParsedCommandLine p = cli({"--analyzer=sim:kt655", "--trace-io", "t.log", "--fault", "baddata",
                                "--fault=timeout:12", "--bus", "11=TCPIP0::127.0.0.1::5025::SOCKET",
-                               "-y", "set", "prf", "10k"});
+                               "-y", "--keep-going", "set", "prf", "10k"});
     ASSERT_EQ(p.error, "");
     EXPECT_EQ(p.options.model, "kt655");
     EXPECT_EQ(p.options.traceFile, "t.log");
     EXPECT_EQ(p.options.faults, (std::vector<std::string>{"baddata", "timeout:12"}));
     EXPECT_EQ(p.options.bus, "11=TCPIP0::127.0.0.1::5025::SOCKET");
     EXPECT_TRUE(p.options.yes);
+    EXPECT_TRUE(p.options.keepGoing);
+    EXPECT_FALSE(cli({"show"}).options.keepGoing);
     EXPECT_EQ(p.rest, (std::vector<std::string>{"set", "prf", "10k"}));
     EXPECT_FALSE(cli({"--bus", "sim"}).options.bus);
 }
@@ -131,6 +133,7 @@ TEST(BenchOptions, TheActionHelpComesFromTheActionTable) {
     EXPECT_EQ(actions.substr(actions.find("  step")),
               "  step FIELD [ROW] up|down    one step of the field, as the arrow keys do\n"
               "  calculate                   solve the timing\n"
+              "  apply                       put the setup onto the instruments (or off)\n"
               "  show                        print the main window state as JSON\n"
               "  help                        print the help file the analyzer reports\n"
               "\nExit status: 0 success, 1 failure, 2 bad command line.\n");
@@ -158,6 +161,7 @@ TEST(BenchOptions, HelpListsEveryOptionOfItsProgram) {
         {"--help", {"--help"}},
         {"--version", {"--version"}},
         {"--yes", {"--yes"}},
+        {"--keep-going", {"--keep-going"}},
         {"--screenshot", {"--screenshot", "w.png"}}};
     for (const Program program : {Program::Gui, Program::Cli}) {
         const std::string usage = usageText(program);

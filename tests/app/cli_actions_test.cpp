@@ -18,12 +18,12 @@ class CliActions : public ::testing::Test {
         form_ = std::make_unique<MainForm>(pulsedModule(), *bench_, ui_);
         form_->Form_Load();
     }
-    int run(const std::vector<std::string>& words) {
+    int run(const std::vector<std::string>& words, bool keepGoing = false) {
         if (!form_) start("kt622");
         out_.str("");
         err_.str("");
         std::vector<Action> actions = parseActions(words);
-        ActionContext ctx{*form_, ui_, out_};
+        ActionContext ctx{*form_, ui_, out_, nullptr, keepGoing};
         return runActions(actions, ctx, err_);
     }
     std::string parseError(const std::vector<std::string>& words) {
@@ -111,6 +111,64 @@ TEST_F(CliActions, CalculateSolvesAndAMessageDuringAnActionIsAFailure) {
         << err_.str();
 }
 
+TEST_F(CliActions, ApplyEchoesTheProcedureAndTheGeneratorRows) {
+    const struct {
+        const char* model;
+        std::vector<std::string> words;
+        std::string echo;
+    } cases[] = {
+        {"kt611", {"apply"}, "apply -> SPulsedModeOn, generator rows programmed: 5\n"},
+        {"kt611",
+         {"set", "nopg", "on", "apply"},
+         "set nopg on -> on\napply -> SPulsedModeOn, generator rows programmed: 0\n"},
+        {"kt611",
+         {"set", "pulsed", "off", "apply"},
+         "set pulsed off -> off\napply -> SPulsedModeOff, generator rows switched off: 5\n"},
+        {"kt622", {"apply"}, "apply -> SPulsedModeOn2\n"},
+        {"kt622",
+         {"set", "pulsed", "off", "apply"},
+         "set pulsed off -> off\napply -> SPulsedModeOff2\n"},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.echo);
+        start(c.model);
+        ASSERT_EQ(run({"calculate"}), 0) << err_.str();
+        ASSERT_EQ(run(c.words), 0) << err_.str();
+        EXPECT_EQ(out_.str(), c.echo);
+    }
+}
+
+TEST_F(CliActions, ApplyFailsWhenRefusedOrWhenItShowsAMessage) {
+    start("kt611");
+    EXPECT_EQ(run({"apply"}), 1);
+    EXPECT_EQ(err_.str(), "zentra-pulse-cli: apply: Apply is disabled\n");
+
+    bench_->faults().add("noidn:12");
+    EXPECT_EQ(run({"calculate", "apply", "show"}), 1);
+    EXPECT_EQ(out_.str().find("apply ->"), std::string::npos) << out_.str();
+    EXPECT_NE(out_.str().find("message: Error reading from signal generator at address 12\n"),
+              std::string::npos)
+        << out_.str();
+    EXPECT_EQ(err_.str(),
+              "zentra-pulse-cli: apply: Error reading from signal generator at address 12\n");
+}
+
+TEST_F(CliActions, KeepGoingRunsTheRestAfterAFailureButNotAfterLostOutput) {
+    start("kt622");
+    EXPECT_EQ(run({"set", "prf", "0", "set", "ifbw", "2k", "apply", "calculate"}, true), 1);
+    EXPECT_EQ(err_.str(),
+              "zentra-pulse-cli: set prf 0: 0 Hz is outside 0.001 Hz to 165 MHz\n"
+              "zentra-pulse-cli: apply: Apply is disabled\n");
+    EXPECT_EQ(out_.str().rfind("set ifbw 2k -> 2000 Hz\ncalculate -> PRF 5000 Hz", 0), 0u)
+        << out_.str();
+
+    out_.setstate(std::ios::badbit);
+    EXPECT_EQ(run({"set", "ifbw", "1k", "set", "ifbw", "3k"}, true), 1);
+    EXPECT_EQ(err_.str(), "zentra-pulse-cli: set ifbw 1k: cannot write the output\n");
+    EXPECT_EQ(form_->VexoEdit_IFBW.value(), 1000.0);
+    out_.clear();
+}
+
 TEST_F(CliActions, StepHelpAndShow) {
     start("kt622");
     const double before = form_->VexoEdit_IFBW.value();
@@ -143,7 +201,8 @@ TEST_F(CliActions, AFailureIsOneLineWhateverTheAnalyzerSaid) {
 
 TEST_F(CliActions, ParseErrorsNameTheWordAndWhatWasExpected) {
     const std::pair<std::vector<std::string>, std::string> cases[] = {
-        {{"frobnicate"}, "unknown action 'frobnicate' (actions: set, step, calculate, show, help)"},
+        {{"frobnicate"},
+         "unknown action 'frobnicate' (actions: set, step, calculate, apply, show, help)"},
         {{"set", "prf"}, "set prf: missing value"},
         {{"set"}, "set: missing FIELD"},
         {{"set", "width", "x", "1us"}, "set width: row must be a whole number from 0, not 'x'"},

@@ -69,6 +69,14 @@ TEST(CliProgram, FailuresEndWithStatusOneAndAReasonOnStderr) {
     EXPECT_EQ(refused.status, 1);
     EXPECT_NE(refused.err.find("zentra-pulse-cli: set prf 1G: "), std::string::npos) << refused.err;
     EXPECT_EQ(refused.out.find('{'), std::string::npos) << "show must not run after a failure";
+
+    // With --keep-going the rest still runs, so the state after the refusal can be shown.
+    RunResult going = runProgram(kCli, {"--keep-going", "set", "prf", "1G", "apply", "show"});
+    EXPECT_EQ(going.status, 1);
+    EXPECT_EQ(going.err,
+              "zentra-pulse-cli: set prf 1G: 1 GHz is outside 0.001 Hz to 165 MHz\n"
+              "zentra-pulse-cli: apply: Apply is disabled\n");
+    EXPECT_EQ(going.out.rfind("{\n \"f_PulsedZentra\"", 0), 0u) << going.out;
 }
 
 TEST(CliProgram, ListsModelsAndRefusesABadCommandLineWithStatusTwo) {
@@ -78,7 +86,8 @@ TEST(CliProgram, ListsModelsAndRefusesABadCommandLineWithStatusTwo) {
     // arguments -> the reason line; the usage hint follows it, nothing runs
     const std::pair<std::vector<std::string>, std::string> cases[] = {
         {{"--analyzer", "sim:kt999", "show"}, "unknown analyzer model 'kt999' (see --list-models)"},
-        {{"frobnicate"}, "unknown action 'frobnicate' (actions: set, step, calculate, show, help)"},
+        {{"frobnicate"},
+         "unknown action 'frobnicate' (actions: set, step, calculate, apply, show, help)"},
         {{"show", "set", "prf"}, "set prf: missing value"},
     };
     for (const auto& [args, reason] : cases) {
