@@ -55,9 +55,9 @@ class LoopbackBus : public zp::BusSource {
   public:
     explicit LoopbackBus(zp::IoTrace& trace) : trace_(trace) {
         for (int address : kAddresses) {
-            resources_[address] = "TCPIP0::127.0.0.1::" +
-                                  std::to_string(generatorServer().server->port(address)) +
-                                  "::SOCKET";
+            resources_[address] =
+                "TCPIP0::127.0.0.1::" + std::to_string(generatorServer().server->port(address)) +
+                "::SOCKET";
         }
     }
     std::unique_ptr<zp::InstrumentBus> createBus() override {
@@ -191,10 +191,6 @@ void BM_BareSocketApplyTraffic(benchmark::State& state) {
     state.counters["bus_queries"] = static_cast<double>(queries);
     state.SetItemsProcessed(state.iterations());
 }
-BENCHMARK(BM_BareSocketApplyTraffic)
-    ->Arg(0)
-    ->Arg(1)
-    ->UseRealTime()
-    ->Unit(benchmark::kMicrosecond);
+BENCHMARK(BM_BareSocketApplyTraffic)->Arg(0)->Arg(1)->UseRealTime()->Unit(benchmark::kMicrosecond);
 
 }  // namespace
