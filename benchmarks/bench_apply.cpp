@@ -154,6 +154,27 @@ void BM_ApplyExternalFiveRowsThroughSockets(benchmark::State& state) {
 }
 BENCHMARK(BM_ApplyExternalFiveRowsThroughSockets)->UseRealTime()->Unit(benchmark::kMicrosecond);
 
+// The same Apply on the in-process simulated generators: the program's own work (and the
+// simulator's) without a socket.
+void BM_ApplyExternalFiveRowsSimulatedBus(benchmark::State& state) {
+    zp::sim::SimBench bench("kt611");
+    zp::PulsedModule moduleState;
+    Unattended ui;
+    zp::MainForm form{moduleState, bench, ui};
+    form.Form_Load();
+    form.b_calculate_Click();
+    for (auto _ : state) {
+        bench.trace()->clear();
+        form.b_Apply_Click();
+        if (!ui.messages.empty()) {
+            state.SkipWithError(ui.messages.front().c_str());
+            break;
+        }
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+BENCHMARK(BM_ApplyExternalFiveRowsSimulatedBus)->UseRealTime()->Unit(benchmark::kMicrosecond);
+
 // What one Apply sends, replayed over bare sockets: arg 0 keeps the connections, 1 makes them
 // anew each time as Apply does.
 void BM_BareSocketApplyTraffic(benchmark::State& state) {
