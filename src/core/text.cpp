@@ -1,6 +1,7 @@
 #include "core/text.h"
 
 #include <algorithm>
+#include <cstdio>
 
 namespace zp {
 
@@ -39,6 +40,52 @@ bool containsIgnoringCase(std::string_view text, std::string_view part) {
     const auto it = std::search(text.begin(), text.end(), part.begin(), part.end(),
                                 [](char x, char y) { return lower(x) == lower(y); });
     return it != text.end() || part.empty();
+}
+
+void appendEscaped(std::string& out, std::string_view text, EscapeStyle style) {
+    const bool json = style == EscapeStyle::Json;
+    for (const char c : text) {
+        const auto code = static_cast<unsigned char>(c);
+        switch (c) {
+            case '"':
+                out += "\\\"";
+                continue;
+            case '\\':
+                out += "\\\\";
+                continue;
+            case '\n':
+                out += "\\n";
+                continue;
+            case '\r':
+                out += "\\r";
+                continue;
+            case '\t':
+                out += "\\t";
+                continue;
+            case '\b':
+                if (json) {
+                    out += "\\b";
+                    continue;
+                }
+                break;
+            case '\f':
+                if (json) {
+                    out += "\\f";
+                    continue;
+                }
+                break;
+            default:
+                break;
+        }
+        if (code < 0x20 || (!json && code == 0x7f)) {
+            char buf[8];
+            std::snprintf(buf, sizeof buf, json ? "\\u%04x" : "\\x%02X",
+                          static_cast<unsigned>(code));
+            out += buf;
+        } else {
+            out += c;
+        }
+    }
 }
 
 }  // namespace zp

@@ -22,4 +22,13 @@ std::string lower(std::string_view text);
 bool equalsIgnoringCase(std::string_view a, std::string_view b);
 bool containsIgnoringCase(std::string_view text, std::string_view part);
 
+// How appendEscaped writes a control character that has no name of its own.
+enum class EscapeStyle {
+    Hex,   // \xHH, and DEL escaped too (the I/O trace)
+    Json,  // \b and \f by name, the rest as \u00hh
+};
+// Appends `text` with quotes and backslashes escaped and line feed, carriage return and tab as
+// \n, \r and \t, so that the result stays on one line; no surrounding quotes.
+void appendEscaped(std::string& out, std::string_view text, EscapeStyle style);
+
 }  // namespace zp

@@ -6,27 +6,20 @@ namespace zp {
 
 namespace {
 
-// One "name": value member.
-template <typename T>
-void member(JsonWriter& w, std::string_view name, const T& v) {
-    w.key(name);
-    w.value(v);
-}
-
 void geometry(JsonWriter& w, const Geometry& g) {
-    member(w, "left", g.left);
-    member(w, "top", g.top);
-    member(w, "width", g.width);
-    member(w, "height", g.height);
+    w.member("left", g.left);
+    w.member("top", g.top);
+    w.member("width", g.width);
+    w.member("height", g.height);
 }
 
 void fieldBody(JsonWriter& w, const EntryField& f) {
     w.beginObject();
-    member(w, "value", f.value());
-    member(w, "enabled", f.enabled());
-    member(w, "text", f.displayText());
-    member(w, "lower", f.lower());
-    member(w, "upper", f.upper());
+    w.member("value", f.value());
+    w.member("enabled", f.enabled());
+    w.member("text", f.displayText());
+    w.member("lower", f.lower());
+    w.member("upper", f.upper());
     w.endObject();
 }
 
@@ -34,18 +27,18 @@ void fieldBody(JsonWriter& w, const EntryField& f) {
 void controlBody(JsonWriter& w, const ControlRegistry::Item& item) {
     const Control& c = ControlRegistry::controlOf(item, -1);
     w.beginObject();
-    member(w, "caption", c.caption);
+    w.member("caption", c.caption);
     if (item.kind == ControlKind::Window) {
-        member(w, "width", c.geometry.width);
-        member(w, "height", c.geometry.height);
+        w.member("width", c.geometry.width);
+        w.member("height", c.geometry.height);
         w.endObject();
         return;
     }
     if (item.kind == ControlKind::CheckBox)
-        member(w, "value", static_cast<int>(static_cast<const CheckBox&>(c).value));
-    if (item.kind == ControlKind::Menu) member(w, "checked", ControlRegistry::checkedOf(item, -1));
-    member(w, "enabled", c.enabled);
-    member(w, "visible", c.visible);
+        w.member("value", static_cast<int>(static_cast<const CheckBox&>(c).value));
+    if (item.kind == ControlKind::Menu) w.member("checked", ControlRegistry::checkedOf(item, -1));
+    w.member("enabled", c.enabled);
+    w.member("visible", c.visible);
     if (item.kind != ControlKind::Menu) geometry(w, c.geometry);
     w.endObject();
 }

@@ -5,43 +5,13 @@
 #include <cstdio>
 #include <stdexcept>
 
+#include "core/text.h"
+
 namespace zp {
 
 std::string jsonQuoted(std::string_view v) {
     std::string out = "\"";
-    for (const char c : v) {
-        switch (c) {
-            case '"':
-                out += "\\\"";
-                break;
-            case '\\':
-                out += "\\\\";
-                break;
-            case '\n':
-                out += "\\n";
-                break;
-            case '\r':
-                out += "\\r";
-                break;
-            case '\t':
-                out += "\\t";
-                break;
-            case '\b':
-                out += "\\b";
-                break;
-            case '\f':
-                out += "\\f";
-                break;
-            default:
-                if (static_cast<unsigned char>(c) < 0x20) {
-                    char buf[8];
-                    std::snprintf(buf, sizeof buf, "\\u%04x", static_cast<unsigned>(c));
-                    out += buf;
-                } else {
-                    out += c;
-                }
-        }
-    }
+    appendEscaped(out, v, EscapeStyle::Json);
     out += '"';
     return out;
 }

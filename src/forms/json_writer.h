@@ -25,6 +25,12 @@ class JsonWriter {
     void value(std::string_view v);
     void value(const char* v) { value(std::string_view(v)); }
     void null();
+    // One "name": value member of the enclosing object.
+    template <typename T>
+    void member(std::string_view name, const T& v) {
+        key(name);
+        value(v);
+    }
 
     const std::string& text() const { return out_; }
 

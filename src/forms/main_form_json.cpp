@@ -11,24 +11,17 @@ namespace zp {
 
 namespace {
 
-// One "name": value member.
-template <typename T>
-void member(JsonWriter& w, std::string_view name, const T& v) {
-    w.key(name);
-    w.value(v);
-}
-
 void flag(JsonWriter& w, const char* name, Bool16 v) {
-    member(w, name, isTrue(v));
+    w.member(name, isTrue(v));
 }
 
 void number(JsonWriter& w, const char* name, double v) {
-    member(w, name, v);
+    w.member(name, v);
 }
 
 template <typename Int>
 void whole(JsonWriter& w, const char* name, Int v) {
-    member(w, name, static_cast<std::int64_t>(v));
+    w.member(name, static_cast<std::int64_t>(v));
 }
 
 template <typename T>
@@ -131,11 +124,11 @@ std::string mainFormJson(const MainForm& f) {
     const AnalyzerStatus s = f.status();
     w.key("status");
     w.beginObject();
-    member(w, "model", s.model);
-    member(w, "options", s.options);
-    member(w, "simulated", s.simulated);
-    member(w, "needsCalculation", s.needsCalculation);
-    member(w, "text", s.text());
+    w.member("model", s.model);
+    w.member("options", s.options);
+    w.member("simulated", s.simulated);
+    w.member("needsCalculation", s.needsCalculation);
+    w.member("text", s.text());
     w.endObject();
     state(w, f.state());
     w.endObject();

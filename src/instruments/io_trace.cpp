@@ -3,39 +3,15 @@
 #include <cstdio>
 #include <stdexcept>
 
+#include "core/text.h"
+
 namespace zp {
 
 namespace {
 
 // Escapes without the surrounding quotes, so error descriptions stay on one line too.
 void appendEscaped(std::string& out, std::string_view text) {
-    for (const char c : text) {
-        switch (c) {
-            case '\n':
-                out += "\\n";
-                break;
-            case '\r':
-                out += "\\r";
-                break;
-            case '\t':
-                out += "\\t";
-                break;
-            case '\\':
-                out += "\\\\";
-                break;
-            case '"':
-                out += "\\\"";
-                break;
-            default:
-                if (static_cast<unsigned char>(c) < 0x20 || c == 0x7f) {
-                    char hex[8];
-                    std::snprintf(hex, sizeof hex, "\\x%02X", static_cast<unsigned char>(c));
-                    out += hex;
-                } else {
-                    out += c;
-                }
-        }
-    }
+    zp::appendEscaped(out, text, EscapeStyle::Hex);
 }
 
 std::string callText(std::string_view object, std::string_view operation,

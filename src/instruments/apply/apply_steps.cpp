@@ -90,4 +90,23 @@ void InternalHardware::take(AnalyzerFrame& frame) {
     frame.runStep([&] { processing = frame.channel().signalProcessingModule(); });
 }
 
+void forEachEnabledGenerator(
+    AnalyzerFrame& frame, const PulsedModule& state, ApplyResult& result,
+    const std::function<void(int i, const PGRow& row, const GeneratorDescriptor& generator)>&
+        program) {
+    for (int i = 0; i < state.NumOutputs && !frame.failed(); ++i) {
+        PGRow row;
+        if (!frame.runStep([&] { row = state.SReadRow(i); })) continue;
+        if (row.enabled <= 0) continue;
+
+        GeneratorDescriptor generator{row.gpibAddress, -1};
+        frame.runStep([&] { generator = frame.generators().open(row.gpibAddress); });
+        frame.runStep([&] { frame.generators().checkIdentification(generator); });
+        program(i, row, generator);
+        if (frame.runStep([&] { frame.generators().checkErrorQueue(generator); })) {
+            ++result.generatorRows;
+        }
+    }
+}
+
 }  // namespace zp::apply

@@ -3,11 +3,13 @@
 // program's own error number, so the frame reports it and ends the procedure there.
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
 
 #include "core/pg_table.h"
+#include "core/pulsed_module.h"
 #include "instruments/analyzer_automation.h"
 #include "instruments/analyzer_frame.h"
 #include "instruments/apply/apply_types.h"
@@ -67,6 +69,14 @@ struct InternalHardware {
         return need(processing, "SignalProcessingModuleFour");
     }
 };
+
+// For every enabled table row, in order: its generator opened and identified, then `program`
+// with the row; a row whose error-queue check passes after that counts in result.generatorRows.
+// Ends at the first failure.
+void forEachEnabledGenerator(
+    AnalyzerFrame& frame, const PulsedModule& state, ApplyResult& result,
+    const std::function<void(int i, const PGRow& row, const GeneratorDescriptor& generator)>&
+        program);
 
 // The internal generators and their routing (analyzer side of SPulsedModeOn2, generator part).
 // `widths` are the width fields; a width the analyzer accepted replaces its row's entry.

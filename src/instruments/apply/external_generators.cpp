@@ -60,33 +60,25 @@ void programExternalGenerators(AnalyzerFrame& frame, const ApplySnapshot& snapsh
     std::vector<std::int16_t> presets(static_cast<std::size_t>(std::max<int>(0, state.NumOutputs)),
                                       0);
     int masterAddress = 0;
-    for (int i = 0; i < state.NumOutputs && !frame.failed(); ++i) {
-        PGRow row;
-        if (!frame.runStep([&] { row = state.SReadRow(i); })) continue;
-        if (row.enabled <= 0) continue;
+    forEachEnabledGenerator(
+        frame, state, result, [&](int i, const PGRow& row, const GeneratorDescriptor& generator) {
+            if (std::find(presets.begin(), presets.end(), row.gpibAddress) == presets.end()) {
+                frame.runStep([&] { frame.generators().write(generator, ":SYST:PRES"); });
+                presets[static_cast<std::size_t>(i)] = row.gpibAddress;
+            }
+            // A row of the master's generator that comes before the master row is a slave.
+            const bool master = isTrue(row.master) || row.gpibAddress == masterAddress;
+            if (master) masterAddress = row.gpibAddress;
+            frame.runStep([&] {
+                SInitPulseGenerator(frame.generators(), generator, row.gateOutput, master);
+            });
 
-        GeneratorDescriptor generator{row.gpibAddress, -1};
-        frame.runStep([&] { generator = frame.generators().open(row.gpibAddress); });
-        frame.runStep([&] { frame.generators().checkIdentification(generator); });
-        if (std::find(presets.begin(), presets.end(), row.gpibAddress) == presets.end()) {
-            frame.runStep([&] { frame.generators().write(generator, ":SYST:PRES"); });
-            presets[static_cast<std::size_t>(i)] = row.gpibAddress;
-        }
-        // A row of the master's generator that comes before the master row is a slave.
-        const bool master = isTrue(row.master) || row.gpibAddress == masterAddress;
-        if (master) masterAddress = row.gpibAddress;
-        frame.runStep(
-            [&] { SInitPulseGenerator(frame.generators(), generator, row.gateOutput, master); });
-
-        std::vector<std::string> commands;
-        frame.runStep([&] { commands = rowCommands(row, snapshot.entries, i); });
-        for (const std::string& command : commands) {
-            frame.runStep([&] { frame.generators().write(generator, command); });
-        }
-        if (frame.runStep([&] { frame.generators().checkErrorQueue(generator); })) {
-            ++result.generatorRows;
-        }
-    }
+            std::vector<std::string> commands;
+            frame.runStep([&] { commands = rowCommands(row, snapshot.entries, i); });
+            for (const std::string& command : commands) {
+                frame.runStep([&] { frame.generators().write(generator, command); });
+            }
+        });
 }
 
 }  // namespace apply

@@ -9,23 +9,14 @@ namespace zp {
 namespace {
 
 void switchOutputsOff(AnalyzerFrame& frame, const PulsedModule& state, ApplyResult& result) {
-    for (int i = 0; i < state.NumOutputs && !frame.failed(); ++i) {
-        PGRow row;
-        if (!frame.runStep([&] { row = state.SReadRow(i); })) continue;
-        if (row.enabled <= 0) continue;
-
-        GeneratorDescriptor generator{row.gpibAddress, -1};
-        frame.runStep([&] { generator = frame.generators().open(row.gpibAddress); });
-        frame.runStep([&] { frame.generators().checkIdentification(generator); });
-        frame.runStep([&] { frame.generators().bus().clearDevice(generator.descriptor); });
-        frame.runStep([&] {
-            frame.generators().write(generator,
-                                     ":OUTP" + std::to_string(row.gateOutput) + ":STAT OFF");
+    apply::forEachEnabledGenerator(
+        frame, state, result, [&](int, const PGRow& row, const GeneratorDescriptor& generator) {
+            frame.runStep([&] { frame.generators().bus().clearDevice(generator.descriptor); });
+            frame.runStep([&] {
+                frame.generators().write(generator,
+                                         ":OUTP" + std::to_string(row.gateOutput) + ":STAT OFF");
+            });
         });
-        if (frame.runStep([&] { frame.generators().checkErrorQueue(generator); })) {
-            ++result.generatorRows;
-        }
-    }
 }
 
 }  // namespace
