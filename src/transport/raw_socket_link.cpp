@@ -265,7 +265,10 @@ std::string RawSocketLink::read(std::size_t maxChars) {
             if (!reply.empty()) midReply_ = reply.back() != '\n';
             return reply;
         }
-        if (!receiveAvailable()) awaitInput(until, "read from ");
+        // Wait before receiving: right after a query the reply is rarely there yet, and a receive
+        // that finds nothing costs a system call on every query.
+        awaitInput(until, "read from ");
+        receiveAvailable();
     }
 }
 
