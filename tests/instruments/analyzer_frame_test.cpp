@@ -178,5 +178,20 @@ TEST(AnalyzerFrame, NothingRunsAfterTheFailure) {
     EXPECT_THROW(AnalyzerFrame(bench).openGenerators(), std::logic_error);
 }
 
+TEST(AnalyzerFrame, FailuresOtherThanAnalyzerErrorsHaveNumberZero) {
+    const std::pair<std::function<void()>, std::string> cases[] = {
+        {[] { throw std::runtime_error("row 3"); }, "row 3"},
+        {[] { throw 42; }, "An unknown error ended the procedure."},
+    };
+    for (const auto& [step, text] : cases) {
+        ProbeBench bench;
+        AnalyzerFrame frame(bench);
+        frame.runStep(step);
+        ASSERT_TRUE(frame.failed());
+        EXPECT_EQ(frame.failure()->number, 0);
+        EXPECT_EQ(frame.failure()->description, text);
+    }
+}
+
 }  // namespace
 }  // namespace zp
