@@ -70,12 +70,18 @@ TEST(PulsedModeOn, PresetMasterAndSlaveFollowTheTable) {
              changeRow(s, 1, [](PGRow& r) { r.master = kTrue; });
          },
          "pulsed_mode_on_master_after_slave.txt", 2},
+        {"a generator at address 1",
+         [](ApplySnapshot& s) {
+             setEnabled(s, {0});
+             changeRow(s, 0, [](PGRow& r) { r.gpibAddress = 1; });
+         },
+         "pulsed_mode_on_address_one.txt", 1},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.name);
         ApplySnapshot s = externalSnapshot();
         c.arrange(s);
-        sim::SimBench bench;
+        sim::SimBench bench("kt622", {}, {1, 11, 12, 13});
         const ApplyResult result = SPulsedModeOn(bench, s);
         EXPECT_FALSE(result.failure);
         EXPECT_EQ(result.generatorRows, c.rows);
