@@ -4,35 +4,23 @@
 #include <gtest/gtest.h>
 
 #include <functional>
-#include <initializer_list>
 #include <optional>
 #include <stdexcept>
 #include <string>
 #include <vector>
 
 #include "instruments/analyzer_frame.h"
+#include "instruments/apply_support.h"
 #include "instruments/probe_bench.h"
 
 namespace zp {
 namespace {
 
-using testing_support::ProbeBench;
-using Lines = std::vector<std::string>;
+using namespace testing_support;
 
-Lines join(std::initializer_list<Lines> parts) {
-    Lines all;
-    for (const Lines& p : parts) all.insert(all.end(), p.begin(), p.end());
-    return all;
-}
-
-const Lines kOpening = {"ANA Application.setUpdateSwitch(false)",
-                        "ANA Application.currentChannel()",
-                        "ANA Channel[1].beginChannelSetup(true)"};
 const Lines kSteps = {
     "ANA Channel[1].setIfBandwidth(1000)", "ANA Channel[1].setCwFrequency(1000000000)",
     "ANA Application.setBusSwitch(true)", "BUS 11 open", "BUS 11 W \":OUTP1:STAT ON\\n\""};
-const Lines kEnd = {"ANA Application.setUpdateSwitch(true)", "ANA Channel[1].endChannelSetup()",
-                    "release Bus", "ANA Application.setBusSwitch(false)", "release Application"};
 
 // Two analyzer calls, the bus switched on and made, one generator command.
 void procedure(AnalyzerFrame& f) {
@@ -65,24 +53,25 @@ TEST(AnalyzerFrame, EveryWayOutCleansUpInTheFrameOrder) {
         procedure(f);
     };
     const Case cases[] = {
-        {"normal end", [](ProbeBench&) {}, plain, join({kOpening, kSteps, kEnd}), {}},
+        {"normal end", [](ProbeBench&) {}, plain, join({kOpening, kSteps, kBusEnd}), {}},
         {"+143 ends its step only",
          [](ProbeBench& b) { fault(b, "Channel.setIfBandwidth", "+143 Parameter conflict"); },
          plain,
          join({kOpening,
                {"ANA Channel[1].setIfBandwidth(1000) !! +143 Parameter conflict"},
                Lines(kSteps.begin() + 2, kSteps.end()),
-               kEnd}),
+               kBusEnd}),
          {}},
         {"error in a step",
          [](ProbeBench& b) { fault(b, "Channel.setCwFrequency", "-222 Data out of range"); }, plain,
          join({kOpening,
                {"ANA Channel[1].setIfBandwidth(1000)",
                 "ANA Channel[1].setCwFrequency(1000000000) !! -222 Data out of range"},
-               {kEnd[0], kEnd[1], kEnd[3], kEnd[4]}}),
+               {kBusEnd[0], kBusEnd[1], kBusEnd[3], kBusEnd[4]}}),
          "-222 Data out of range"},
         {"error that is no InstrumentError", [](ProbeBench&) {}, throwInStep,
-         join({kOpening, {kEnd[0], kEnd[1], kEnd[3], kEnd[4]}}), "table row 3 has no address"},
+         join({kOpening, {kBusEnd[0], kBusEnd[1], kBusEnd[3], kBusEnd[4]}}),
+         "table row 3 has no address"},
         {"no connection",
          [](ProbeBench& b) { b.connectError.emplace(-5, "-5 No analyzer"); },
          plain,
@@ -91,21 +80,21 @@ TEST(AnalyzerFrame, EveryWayOutCleansUpInTheFrameOrder) {
         {"setUpdateSwitch(false) fails",
          [](ProbeBench& b) { fault(b, "Application.setUpdateSwitch", "-200 Execution error", 1); },
          plain,
-         {"ANA Application.setUpdateSwitch(false) !! -200 Execution error", kEnd[0], kEnd[3],
-          kEnd[4]},
+         {"ANA Application.setUpdateSwitch(false) !! -200 Execution error", kBusEnd[0], kBusEnd[3],
+          kBusEnd[4]},
          "-200 Execution error"},
         {"beginChannelSetup fails",
          [](ProbeBench& b) { fault(b, "Channel.beginChannelSetup", "-221 Settings conflict"); },
          plain,
          {kOpening[0], kOpening[1],
-          "ANA Channel[1].beginChannelSetup(true) !! -221 Settings conflict", kEnd[0], kEnd[1],
-          kEnd[3], kEnd[4]},
+          "ANA Channel[1].beginChannelSetup(true) !! -221 Settings conflict", kBusEnd[0],
+          kBusEnd[1], kBusEnd[3], kBusEnd[4]},
          "-221 Settings conflict"},
         {"bus object cannot be made",
          [](ProbeBench& b) { b.busError.emplace(1, "GPIB board 0 does not exist"); }, plain,
          join({kOpening,
                Lines(kSteps.begin(), kSteps.begin() + 3),
-               {kEnd[0], kEnd[1], kEnd[3], kEnd[4]}}),
+               {kBusEnd[0], kBusEnd[1], kBusEnd[3], kBusEnd[4]}}),
          "GPIB board 0 does not exist"},
         {"failing setUpdateSwitch(true) on the error path is ignored",
          [](ProbeBench& b) { fault(b, "Channel.setIfBandwidth", "-222 Data out of range"); },
@@ -116,7 +105,7 @@ TEST(AnalyzerFrame, EveryWayOutCleansUpInTheFrameOrder) {
          join({kOpening,
                {"ANA Channel[1].setIfBandwidth(1000) !! -222 Data out of range",
                 "ANA Application.setUpdateSwitch(true) !! -999 Display busy"},
-               {kEnd[1], kEnd[3], kEnd[4]}}),
+               {kBusEnd[1], kBusEnd[3], kBusEnd[4]}}),
          "-222 Data out of range"},
         {"failing setUpdateSwitch(true) at the normal end is the failure", [](ProbeBench&) {},
          [](AnalyzerFrame& f, ProbeBench& b) {
@@ -125,8 +114,8 @@ TEST(AnalyzerFrame, EveryWayOutCleansUpInTheFrameOrder) {
          },
          join({kOpening,
                kSteps,
-               {"ANA Application.setUpdateSwitch(true) !! -999 Display busy", kEnd[1], kEnd[2],
-                kEnd[3], kEnd[4]}}),
+               {"ANA Application.setUpdateSwitch(true) !! -999 Display busy", kBusEnd[1],
+                kBusEnd[2], kBusEnd[3], kBusEnd[4]}}),
          "-999 Display busy"},
     };
     for (const Case& c : cases) {
@@ -151,7 +140,7 @@ TEST(AnalyzerFrame, DestructorClosesWhenFinishIsMissingOrAnExceptionPasses) {
         frame.runStep([&] { frame.channel().setIfBandwidth(1000); });
     }
     EXPECT_EQ(left.timeline(),
-              join({kOpening, {kSteps[0], kEnd[0], kEnd[1], "release Application"}}));
+              join({kOpening, {kSteps[0], kBusEnd[0], kBusEnd[1], "release Application"}}));
 
     // While an exception passes, clean-up failures are ignored and it goes on to the end.
     ProbeBench thrown;
@@ -163,10 +152,10 @@ TEST(AnalyzerFrame, DestructorClosesWhenFinishIsMissingOrAnExceptionPasses) {
             throw std::out_of_range("row 9");
         },
         std::out_of_range);
-    EXPECT_EQ(thrown.timeline(),
-              join({kOpening,
-                    {kSteps[2], kEnd[0], "ANA Channel[1].endChannelSetup() !! -200 Execution error",
-                     kEnd[2], kEnd[3], kEnd[4]}}));
+    EXPECT_EQ(thrown.timeline(), join({kOpening,
+                                       {kSteps[2], kBusEnd[0],
+                                        "ANA Channel[1].endChannelSetup() !! -200 Execution error",
+                                        kBusEnd[2], kBusEnd[3], kBusEnd[4]}}));
 }
 
 TEST(AnalyzerFrame, NothingRunsAfterTheFailure) {
@@ -187,6 +176,21 @@ TEST(AnalyzerFrame, NothingRunsAfterTheFailure) {
     EXPECT_EQ(bench.timeline().size(), lines + 3) << "a second finish touches nothing";
     EXPECT_THROW(frame.runStep([] {}), std::logic_error);
     EXPECT_THROW(AnalyzerFrame(bench).openGenerators(), std::logic_error);
+}
+
+TEST(AnalyzerFrame, FailuresOtherThanAnalyzerErrorsHaveNumberZero) {
+    const std::pair<std::function<void()>, std::string> cases[] = {
+        {[] { throw std::runtime_error("row 3"); }, "row 3"},
+        {[] { throw 42; }, "An unknown error ended the procedure."},
+    };
+    for (const auto& [step, text] : cases) {
+        ProbeBench bench;
+        AnalyzerFrame frame(bench);
+        frame.runStep(step);
+        ASSERT_TRUE(frame.failed());
+        EXPECT_EQ(frame.failure()->number, 0);
+        EXPECT_EQ(frame.failure()->description, text);
+    }
 }
 
 }  // namespace

@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
+#include <filesystem>
+#include <fstream>
 #include <initializer_list>
 #include <memory>
 #include <string>
@@ -86,6 +88,16 @@ class RecordingSolver : public TimingSolver {
     }
     std::vector<std::pair<double, double>>& calls_;
 };
+
+// A hand-written expected trace in tests/instruments/expected/: one line each, "#" for a note.
+inline Lines expectedLines(const std::string& name) {
+    std::ifstream in(std::filesystem::path(__FILE__).parent_path() / "expected" / name);
+    Lines out;
+    for (std::string line; std::getline(in, line);) {
+        if (line.rfind('#', 0) != 0) out.push_back(line);
+    }
+    return out;
+}
 
 // The trace lines that contain any of the parts.
 inline Lines linesWith(const Lines& lines, std::initializer_list<std::string_view> parts) {

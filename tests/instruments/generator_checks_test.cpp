@@ -1,11 +1,13 @@
 #include <gtest/gtest.h>
 
 #include <deque>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "instruments/error_capture.h"
+#include "instruments/generator_session.h"
 #include "instruments/instrument_bus.h"
 #include "instruments/instrument_error.h"
 
@@ -62,6 +64,16 @@ TEST(GeneratorChecksTest, OpenAndIdentifyWithTheFixedSettings) {
     bus.replies.push_back("Veltrix,PG,1,1.0\n");
     checkIdentification(bus, 7, 11);
     EXPECT_EQ(bus.writes, (std::vector<std::string>{"7:*IDN?\n"}));
+    EXPECT_EQ(bus.buffers, (std::vector<std::string>{std::string(100, ' ')}));
+}
+
+TEST(GeneratorChecksTest, SessionQueryHandsTheSameBuffer) {
+    auto owned = std::make_unique<FakeBus>();
+    FakeBus& bus = *owned;
+    bus.replies.push_back("5000\n");
+    GeneratorSession session(std::move(owned));
+    EXPECT_EQ(session.query({12, 7}, ":SOUR:FREQ?"), "5000\n");
+    EXPECT_EQ(bus.writes, (std::vector<std::string>{"7::SOUR:FREQ?\n"}));
     EXPECT_EQ(bus.buffers, (std::vector<std::string>{std::string(100, ' ')}));
 }
 

@@ -59,8 +59,14 @@ TEST(IoTraceTest, FileReceivesEveryLineAsItIsWrittenOrRefusesAnUnwritablePath) {
         EXPECT_EQ(line, "BUS 11 W \"A\\n\"");
         EXPECT_FALSE(std::getline(in, line));
     }
+    EXPECT_FALSE(trace.fileFailed());
     std::filesystem::remove(path);
     EXPECT_THROW(IoTrace().openFile("/nonexistent-dir/zp/trace.log"), std::runtime_error);
+    IoTrace full;
+    EXPECT_FALSE(full.fileFailed()) << "no file, no failure";
+    full.openFile("/dev/full");
+    full.busEvent(11, "open");
+    EXPECT_TRUE(full.fileFailed());
 }
 
 TEST(IoTraceTest, ConcurrentWritersLoseNoLines) {

@@ -13,23 +13,6 @@ namespace {
 
 using namespace testing_support;
 
-Lines outputOff(const std::string& a, const std::string& n) {
-    return {"BUS " + a + " open",
-            "BUS " + a + " W \"*IDN?\\n\"",
-            "BUS " + a + " R \"Veltrix,PG8102A,SIM" + a + ",1.0\\n\"",
-            "BUS " + a + " clear",
-            "BUS " + a + " W \":OUTP" + n + ":STAT OFF\\n\"",
-            "BUS " + a + " W \":SYST:ERR?\\n\"",
-            "BUS " + a + " R \"+0,\\\"No error\\\"\\n\""};
-}
-
-const Lines kMessageCleared = {"ANA Application.messageArea()", "ANA MessageArea.setText(\"\")"};
-const Lines kIfOff = {"ANA Channel[1].ifConfiguration()",
-                      "ANA IFConfiguration[1].setIfSwitchA(false)",
-                      "ANA IFConfiguration[1].setIfSwitchB(false)",
-                      "ANA IFConfiguration[1].setReceiverSwitch(\"ALL\", false)",
-                      "ANA IFConfiguration[1].setInternalGateSwitch(false)"};
-
 TEST(PulsedModeOff, OnlyTheUsedOutputsGoOffThenTheIfGating) {
     ApplySnapshot s = snapshotFor("zx20-j55");  // internal gates: their switch goes off too
     changeRow(s, 3, [](PGRow& r) { r.enabled = kUnchecked; });
@@ -37,16 +20,7 @@ TEST(PulsedModeOff, OnlyTheUsedOutputsGoOffThenTheIfGating) {
     const ApplyResult result = SPulsedModeOff(bench, s);
     EXPECT_FALSE(result.failure);
     EXPECT_EQ(result.generatorRows, 4);
-    EXPECT_EQ(bench.timeline(), join({kOpening,
-                                      kMessageCleared,
-                                      {"ANA Application.setBusSwitch(true)"},
-                                      outputOff("11", "1"),
-                                      outputOff("11", "2"),
-                                      outputOff("12", "1"),
-                                      outputOff("13", "1"),
-                                      kIfOff,
-                                      {"ANA Channel[1].setFrequencyOffsetFrequency(0)"},
-                                      kBusEnd}));
+    EXPECT_EQ(bench.timeline(), expectedLines("pulsed_mode_off_used_outputs.txt"));
 }
 
 TEST(PulsedModeOff, NoPGStillMakesAndReleasesTheBus) {
@@ -55,9 +29,7 @@ TEST(PulsedModeOff, NoPGStillMakesAndReleasesTheBus) {
     s.mode.converterMeas = true;
     ProbeBench bench("zx20-j55");
     EXPECT_FALSE(SPulsedModeOff(bench, s).failure);
-    EXPECT_EQ(
-        bench.timeline(),
-        join({kOpening, kMessageCleared, {"ANA Application.setBusSwitch(true)"}, kIfOff, kBusEnd}));
+    EXPECT_EQ(bench.timeline(), expectedLines("pulsed_mode_off_no_pg.txt"));
 }
 
 TEST(PulsedModeOff, AGeneratorErrorLeavesLaterRowsOnAndTheIfGating) {
@@ -74,15 +46,6 @@ TEST(PulsedModeOff, AGeneratorErrorLeavesLaterRowsOnAndTheIfGating) {
               Lines{});
 }
 
-const Lines kHardwareObjects = {
-    "ANA Channel[1].pulseGenerator()", "ANA Channel[1].pathConfiguration()",
-    "ANA Channel[1].ifConfiguration()", "ANA Channel[1].signalProcessingModule()"};
-
-Lines element(const std::string& name, const std::string& value) {
-    return {"ANA PathConfiguration[1].element(\"" + name + "\")",
-            "ANA PathElement[1:" + name + "].setValue(\"" + value + "\")"};
-}
-
 TEST(PulsedModeOff2, EveryRowsGeneratorGoesOffAndTheHardwareBackToNormal) {
     ApplySnapshot s = snapshotFor("kt622");
     changeRow(s, 2, [](PGRow& r) { r.enabled = kUnchecked; });  // still switched off
@@ -90,34 +53,7 @@ TEST(PulsedModeOff2, EveryRowsGeneratorGoesOffAndTheHardwareBackToNormal) {
     s.state.HasModSource2 = kTrue;  // one source: no port 3 call all the same
     ProbeBench bench;
     EXPECT_FALSE(SPulsedModeOff2(bench, s).failure);
-    const auto off = [](const std::string& g) {
-        return Lines{"ANA PulseGenerator[1].setState(" + g + ", false)"};
-    };
-    EXPECT_EQ(bench.timeline(), join({kOpening,
-                                      kHardwareObjects,
-                                      off("1"),
-                                      element("PulseModDrive", "ON"),
-                                      off("2"),
-                                      element("IFGateA", "ON"),
-                                      off("2"),
-                                      element("IFGateB", "ON"),
-                                      off("3"),
-                                      element("IFGateR1", "ON"),
-                                      off("2"),
-                                      element("IFGateR2", "ON"),
-                                      element("IFAntiAliasFilter", "AUTO"),
-                                      element("IFSigPathAll", "WBF"),
-                                      {"ANA IFConfiguration[1].setNarrowbandSwitch(0)",
-                                       "ANA SignalProcessingModuleFour[1].setProcessingSwitch(0)",
-                                       "ANA PulseGenerator[1].setState(0, false)"},
-                                      kMessageCleared,
-                                      element("NBFATNA", "3"),
-                                      element("NBFATNB", "3"),
-                                      element("NBFATNR1", "3"),
-                                      element("NBFATNR2", "3"),
-                                      {"ANA Channel[1].setALCLevelingMode(1, 0)"},
-                                      element("Src1Out1PulseModEnable", "Disable"),
-                                      kEnd}));
+    EXPECT_EQ(bench.timeline(), expectedLines("pulsed_mode_off2_every_row.txt"));
 }
 
 TEST(PulsedModeOff2, GatesAndLevelingByModel) {

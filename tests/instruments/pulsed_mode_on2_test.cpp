@@ -29,70 +29,13 @@ TEST(PulsedModeOn2, TwoPortWithModulatorAndSoftwareGating) {
     for (int r : {2, 3, 4})
         changeRow(s, r, [&](PGRow& row) { row.intPGOutput = std::min(r + 1, 4); });
     changeRow(s, 3, [](PGRow& row) { row.enabled = kUnchecked; });
-    s.entries.widths = {1e-6, 1.234e-6, 5e-7, 6e-7, 8e-7};  // 1.234 us is not on the 10 ns grid
+    s.entries.widths = {1e-6, 1.234e-6, 5e-7, 6e-7, 8e-7};
     s.entries.delays = {0, 2e-7, 1e-7, 0, 0};
     s.state.ReceiverGains = {3, 3, 0, 1};  // A, R1, R2, B
     ProbeBench bench;
     const ApplyResult result = SPulsedModeOn2(bench, s);
     EXPECT_FALSE(result.failure);
-    const auto programmed = [](const std::string& element, const std::string& g,
-                               const std::string& width, const std::string& accepted,
-                               const std::string& delay) -> Lines {
-        return {"ANA PathConfiguration[1].element(\"" + element + "\")",
-                "ANA PathElement[1:" + element + "].setValue(\"Pulse" + g + "\")",
-                "ANA PulseGenerator[1].setWidth(" + g + ", " + width + ")",
-                "ANA PulseGenerator[1].width(" + g + ") -> " + accepted,
-                "ANA PulseGenerator[1].setDelay(" + g + ", " + delay + ")",
-                "ANA PulseGenerator[1].setState(" + g + ", true)"};
-    };
-    const auto element = [](const std::string& name, const std::string& value) -> Lines {
-        return {"ANA PathConfiguration[1].element(\"" + name + "\")",
-                "ANA PathElement[1:" + name + "].setValue(\"" + value + "\")"};
-    };
-    const std::string modes = " -> {\"INTernal\", \"EXTernal\", \"OPENloop\"}";
-    EXPECT_EQ(
-        bench.timeline(),
-        join({kOpening,
-              {"ANA Channel[1].pulseGenerator()", "ANA Channel[1].pathConfiguration()",
-               "ANA Channel[1].ifConfiguration()", "ANA Channel[1].signalProcessingModule()",
-               "ANA PulseGenerator[1].setPeriod(0.0001)"},
-              programmed("PulseModDrive", "1", "1E-06", "1E-06", "0"),
-              programmed("IFGateA", "2", "1.234E-06", "1.23E-06", "2E-07"),
-              programmed("IFGateB", "3", "5E-07", "5E-07", "1E-07"),
-              element("IFGateR1", "ON"),
-              programmed("IFGateR2", "4", "8E-07", "8E-07", "0"),
-              element("IFSigPathAll", "NBF"),
-              {"ANA IFConfiguration[1].setNarrowbandValue(2400)",
-               "ANA IFConfiguration[1].setNarrowbandSwitch(1)",
-               "ANA SignalProcessingModuleFour[1].setProcessingRate(2500)",
-               "ANA SignalProcessingModuleFour[1].setCoefficientsA({4, 1})",
-               "ANA SignalProcessingModuleFour[1].setFilterType(\"PWIN\")",
-               "ANA SignalProcessingModuleFour[1].setFilterParameter(\"C\", 7)",
-               "ANA SignalProcessingModuleFour[1].setFilterParameter(\"P\", 0.0001)",
-               "ANA SignalProcessingModuleFour[1].setFilterParameter(\"D\", 1E-06)",
-               "ANA SignalProcessingModuleFour[1].setFilterParameter(\"W\", 2E-06)",
-               "ANA SignalProcessingModuleFour[1].setFilterParameter(\"R\", 200)",
-               "ANA PulseGenerator[1].setWidth(0, 1E-08)", "ANA PulseGenerator[1].setDelay(0, 0)",
-               "ANA PulseGenerator[1].setState(0, true)",
-               "ANA SignalProcessingModuleFour[1].setProcessingSwitch(1)"},
-              element("NBFATNA", "123"),  // Auto: the solver, with the accepted width
-              element("NBFATNB", "15"),   // Medium
-              element("NBFATNR1", "60"),  // Auto
-              element("NBFATNR2", "30"),  // Low
-              {"ANA Application.messageArea()",
-               "ANA MessageArea.setText(\"Pulsed IFBW setting is 2500 Hz\")",
-               "ANA Channel[1].setIfBandwidth(2500)",
-               "ANA PathConfiguration[1].elementNames() -> {\"IFAntiAliasFilter\", \"IFGateA\", "
-               "\"IFGateB\", \"IFGateR1\", \"IFGateR2\", \"IFSigPathAll\", \"NBFATNA\", "
-               "\"NBFATNB\", \"NBFATNR1\", \"NBFATNR2\", \"PulseModDrive\", "
-               "\"Src1Out1PulseModEnable\"}"},
-              element("Src1Out1PulseModEnable", "Enable"),
-              {"ANA Application.hardwareInfo()", "ANA Caps.portCount() -> 2",
-               "ANA Channel[1].getSupportedALCModes(1)" + modes,
-               "ANA Channel[1].setALCLevelingMode(1, 2)",
-               "ANA Channel[1].getSupportedALCModes(2)" + modes,
-               "ANA Channel[1].setALCLevelingMode(2, 2)"},
-              kEnd}));
+    EXPECT_EQ(bench.timeline(), expectedLines("pulsed_mode_on2_two_port.txt"));
     EXPECT_EQ(result.acceptedWidths,
               (std::vector<std::optional<double>>{1e-6, 1.23e-6, 5e-7, std::nullopt, 8e-7}));
     EXPECT_EQ(calls, (Calls{{10000, 1.23e-6}, {10000, 6e-7}}));

@@ -14,24 +14,6 @@ namespace {
 
 using namespace testing_support;
 
-const Lines kAnalyzerSide = {
-    "ANA Application.messageArea()",
-    "ANA MessageArea.setText(\"Pulsed IFBW setting is 2500 Hz\")",
-    "ANA Channel[1].setIfBandwidth(2500)",
-    "ANA Channel[1].ifConfiguration()",
-    "ANA IFConfiguration[1].setIfSwitchA(true)",
-    "ANA IFConfiguration[1].setIfTimeA(6.2E-06)",
-    "ANA IFConfiguration[1].setIfSwitchB(true)",
-    "ANA IFConfiguration[1].setIfCountB(4)",
-    "ANA IFConfiguration[1].setReceiverSwitch(\"ALL\", true)",
-    "ANA IFConfiguration[1].setReceiverGain(\"A\", 1)",
-    "ANA IFConfiguration[1].setReceiverGain(\"R1\", 0)",
-    "ANA IFConfiguration[1].setReceiverGain(\"R2\", 2)",
-    "ANA IFConfiguration[1].setReceiverGain(\"B\", 1)",
-    "ANA Channel[1].setFrequencyOffsetState(1)",
-    "ANA Channel[1].setFrequencyOffsetFrequency(125)",
-};
-
 ApplySnapshot externalSnapshot() {
     ApplySnapshot s = snapshotFor("kt622");
     s.state.ReceiverGains = {3, 0, 2, 1};  // A on Auto, which stands for 1 here
@@ -53,145 +35,71 @@ TEST(PulsedModeOn, AFirstMasterRowOnOutputOneFromIdentificationToErrorQueue) {
     const ApplyResult result = SPulsedModeOn(bench, s);
     EXPECT_FALSE(result.failure);
     EXPECT_EQ(result.generatorRows, 1);
-    EXPECT_EQ(bench.timeline(), join({kOpening,
-                                      {"ANA Application.setBusSwitch(true)",
-                                       "BUS 11 open",
-                                       "BUS 11 W \"*IDN?\\n\"",
-                                       "BUS 11 R \"Veltrix,PG8102A,SIM11,1.0\\n\"",
-                                       "BUS 11 W \":SYST:PRES\\n\"",
-                                       "BUS 11 W \"*CLS\\n\"",
-                                       "BUS 11 W \":OUTP1:POL NORM\\n\"",
-                                       "BUS 11 W \":HOLD VOLT\\n\"",
-                                       "BUS 11 W \":VOLT1:HIGH 2.5\\n\"",
-                                       "BUS 11 W \":VOLT1:LOW 0\\n\"",
-                                       "BUS 11 W \":TRIG:SOUR INT2\\n\"",
-                                       "BUS 11 W \":ARM:SOUR IMM\\n\"",
-                                       "BUS 11 W \":SOUR:ROSC:SOUR EXT\\n\"",
-                                       "BUS 11 W \":SOUR:ROSC:EXT:FREQ 10MHZ\\n\"",
-                                       "BUS 11 W \":VOLT1:HIGH 3.3\\n\"",
-                                       "BUS 11 W \":VOLT1:LOW -0.7\\n\"",
-                                       "BUS 11 W \":OUTP1:IMP:EXT 50\\n\"",
-                                       "BUS 11 W \":OUTP1:POL INV\\n\"",
-                                       "BUS 11 W \":SOUR:FREQ 12345.678\\n\"",
-                                       "BUS 11 W \":SOUR:PULS:WIDT1 1.23456789012345E-06\\n\"",
-                                       "BUS 11 W \":SOUR:PULS:DEL1 2.5E-06\\n\"",
-                                       "BUS 11 W \":OUTP1:STAT ON\\n\"",
-                                       "BUS 11 W \":SYST:ERR?\\n\"",
-                                       "BUS 11 R \"+0,\\\"No error\\\"\\n\""},
-                                      kAnalyzerSide,
-                                      kBusEnd}));
-}
-
-// Expected bus writes of one row, in the short form of busWrites.
-Lines identified(const std::string& a) {
-    return {a + " open", a + " *IDN?"};
-}
-Lines init(const std::string& a, const std::string& n, bool master) {
-    Lines l = {a + " *CLS", a + " :OUTP" + n + ":POL NORM", a + " :HOLD VOLT",
-               a + " :VOLT" + n + ":HIGH 2.5", a + " :VOLT" + n + ":LOW 0"};
-    if (master) {
-        return join({l,
-                     {a + " :TRIG:SOUR INT2", a + " :ARM:SOUR IMM", a + " :SOUR:ROSC:SOUR EXT",
-                      a + " :SOUR:ROSC:EXT:FREQ 10MHZ"}});
-    }
-    return join({l, {a + " :ARM:SOUR EXT"}});
-}
-Lines program(const std::string& a, const std::string& n, bool inverted = true) {
-    Lines l = {a + " :VOLT" + n + ":HIGH 5", a + " :VOLT" + n + ":LOW 0",
-               a + " :OUTP" + n + ":IMP:EXT 10000"};
-    if (inverted) l.push_back(a + " :OUTP" + n + ":POL INV");
-    return join(
-        {l,
-         {a + " :SOUR:FREQ 10000", a + " :SOUR:PULS:WIDT" + n + " 1E-06",
-          a + " :SOUR:PULS:DEL" + n + " 0", a + " :OUTP" + n + ":STAT ON", a + " :SYST:ERR?"}});
+    EXPECT_EQ(bench.timeline(), expectedLines("pulsed_mode_on_first_master_row.txt"));
 }
 
 TEST(PulsedModeOn, PresetMasterAndSlaveFollowTheTable) {
     struct Case {
         const char* name;
         std::function<void(ApplySnapshot&)> arrange;
-        Lines bus;
+        const char* bus;  // expected bus writes, in the short form of busWrites
         int rows;
     };
-    const bool master = true, slave = false;
     const Case cases[] = {
         {"two rows on outputs 1 and 2 of one generator: one preset",
          [](ApplySnapshot& s) {
              setEnabled(s, {0, 1});
          },
-         join({identified("11"),
-               {"11 :SYST:PRES"},
-               init("11", "1", master),
-               program("11", "1"),
-               identified("11"),
-               init("11", "2", master),
-               program("11", "2")}),
-         2},
+         "pulsed_mode_on_two_outputs.txt", 2},
         {"disabled rows send nothing; without a master row every row is a slave",
          [](ApplySnapshot& s) {
              setEnabled(s, {2, 4});
              changeRow(s, 0, [](PGRow& r) { r.master = kFalse; });
          },
-         join({identified("12"),
-               {"12 :SYST:PRES"},
-               init("12", "1", slave),
-               program("12", "1"),
-               identified("13"),
-               {"13 :SYST:PRES"},
-               init("13", "1", slave),
-               program("13", "1")}),
-         2},
+         "pulsed_mode_on_slaves_only.txt", 2},
         {"complement clear: no polarity command after the initialisation",
          [](ApplySnapshot& s) {
              setEnabled(s, {0});
              changeRow(s, 0, [](PGRow& r) { r.complement = kUnchecked; });
          },
-         join({identified("11"),
-               {"11 :SYST:PRES"},
-               init("11", "1", master),
-               program("11", "1", false)}),
-         1},
+         "pulsed_mode_on_no_complement.txt", 1},
         {"a master row after a slave row of the same generator",
          [](ApplySnapshot& s) {
              setEnabled(s, {0, 1});
              changeRow(s, 0, [](PGRow& r) { r.master = kFalse; });
              changeRow(s, 1, [](PGRow& r) { r.master = kTrue; });
          },
-         join({identified("11"),
-               {"11 :SYST:PRES"},
-               init("11", "1", slave),
-               program("11", "1"),
-               identified("11"),
-               init("11", "2", master),
-               program("11", "2")}),
-         2},
+         "pulsed_mode_on_master_after_slave.txt", 2},
+        {"a generator at address 1",
+         [](ApplySnapshot& s) {
+             setEnabled(s, {0});
+             changeRow(s, 0, [](PGRow& r) { r.gpibAddress = 1; });
+         },
+         "pulsed_mode_on_address_one.txt", 1},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.name);
         ApplySnapshot s = externalSnapshot();
         c.arrange(s);
-        sim::SimBench bench;
+        sim::SimBench bench("kt622", {}, {1, 11, 12, 13});
         const ApplyResult result = SPulsedModeOn(bench, s);
         EXPECT_FALSE(result.failure);
         EXPECT_EQ(result.generatorRows, c.rows);
-        EXPECT_EQ(busWrites(bench.trace()->lines()), c.bus);
+        EXPECT_EQ(busWrites(bench.trace()->lines()), expectedLines(c.bus));
     }
 }
 
 TEST(PulsedModeOn, NoPGProgramsTheAnalyzerOnlyAndASkippableErrorEndsOnlyItsStep) {
     ApplySnapshot s = externalSnapshot();
     s.mode.noPG = true;
-    s.mode.converterMeas = true;  // the frequency offset is left alone
+    s.mode.converterMeas = true;
     ProbeBench bench;
     bench.sim().faults().analyzer.push_back(
         {"IFConfiguration.setIfTimeA", "+143 Parameter conflict", -1});
     const ApplyResult result = SPulsedModeOn(bench, s);
     EXPECT_FALSE(result.failure);
     EXPECT_EQ(result.generatorRows, 0);
-    Lines analyzer(kAnalyzerSide.begin(), kAnalyzerSide.end() - 1);
-    analyzer[5] = "ANA IFConfiguration[1].setIfTimeA(6.2E-06) !! +143 Parameter conflict";
-    EXPECT_EQ(bench.timeline(),
-              join({kOpening, {"ANA Application.setBusSwitch(true)"}, analyzer, kBusEnd}));
+    EXPECT_EQ(bench.timeline(), expectedLines("pulsed_mode_on_no_pg.txt"));
 }
 
 TEST(PulsedModeOn, AFailedIdentificationStopsTheProcedure) {

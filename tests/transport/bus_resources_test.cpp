@@ -82,6 +82,8 @@ TEST(ParseBusResources, RefusalNamesTheEntryAndWhatWasExpected) {
         {"11=GPIB0::-3::INSTR", "the GPIB address must be a number from 0 to 30, not \"-3\""},
         {"11=TCPIP0::gw::gpib0,,,,::INSTR",
          "device \"gpib0,,,,\" must be NAME, NAME,N or NAME,N,S with numbers N and S (gpib0,12)"},
+        {"11=TCPIP0::gw::,5::INSTR",
+         "device \",5\" must be NAME, NAME,N or NAME,N,S with numbers N and S (gpib0,12)"},
         {"11=TCPIP0::gw::gpib0,5,::INSTR",
          "device \"gpib0,5,\" must be NAME, NAME,N or NAME,N,S with numbers N and S (gpib0,12)"},
         {"11=TCPIP0::::1::5025::SOCKET",
@@ -95,6 +97,10 @@ TEST(ParseBusResources, RefusalNamesTheEntryAndWhatWasExpected) {
          "host \"[\" is not an IPv6 address in brackets, as in [::1]"},
         {"11=TCPIP0::[::1]::INSTR",
          "VXI-11 is reached over IPv4 only; give the host's IPv4 address or name"},
+        {"11=GPIB0::5::31::INSTR",
+         "the secondary address must be a number from 0 to 30, not \"31\""},
+        {"11=GPIB0::1::2::3::INSTR",
+         "too many fields; expected GPIB0::N::INSTR or GPIB0::N::S::INSTR"},
     };
     for (const auto& [text, reason] : cases) {
         try {
@@ -115,15 +121,19 @@ TEST(ParseResource, Kinds) {
     const auto vxi = std::get<Vxi11Resource>(parseResource("TCPIP0::gateway::gpib0,7::INSTR"));
     EXPECT_EQ(vxi.host + " " + vxi.device, "gateway gpib0,7");
     EXPECT_EQ(std::get<Vxi11Resource>(parseResource("TCPIP::scope::INSTR")).device, "inst0");
-    const auto gpib = std::get<GpibResource>(parseResource("GPIB1::22::3::INSTR"));
+    const auto gpib = std::get<GpibResource>(parseResource("GPIB1::30::30::INSTR"));
     EXPECT_EQ(std::vector<int>({gpib.board, gpib.primary, gpib.secondary}),
-              std::vector<int>({1, 22, 3}));
+              std::vector<int>({1, 30, 30}));
     EXPECT_EQ(std::get<GpibResource>(parseResource("GPIB::4::INSTR")).secondary, -1);
     const auto ipv6 =
         std::get<SocketResource>(parseResource("TCPIP0::[fe80::1%eth0]::5025::SOCKET"));
     EXPECT_EQ(ipv6.host, "fe80::1%eth0");
     EXPECT_EQ(std::get<Vxi11Resource>(parseResource("TCPIP0::gw::gpib0,7,3::INSTR")).device,
               "gpib0,7,3");
+    const std::string longest(253, 'h');  // the longest DNS name
+    EXPECT_EQ(std::get<SocketResource>(parseResource("TCPIP0::" + longest + "::1::SOCKET")).host,
+              longest);
+    EXPECT_THROW(parseResource("TCPIP0::" + longest + "h::1::SOCKET"), transport::BadResource);
 }
 
 }  // namespace

@@ -5,7 +5,12 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <chrono>
+#include <filesystem>
+#include <iterator>
+#include <memory>
+#include <thread>
 
 #include "instruments/error_capture.h"
 #include "instruments/instrument_error.h"
@@ -37,6 +42,14 @@ using transport::RawSocketLink;
 
 constexpr std::uint16_t kErr = InstrumentBus::kStatusError;
 constexpr std::uint16_t kTimo = InstrumentBus::kStatusTimeout;
+using Lines = std::vector<std::string>;
+
+// Sockets this process holds open.
+std::size_t openDescriptors() {
+    return static_cast<std::size_t>(
+        std::distance(std::filesystem::directory_iterator("/proc/self/fd"),
+                      std::filesystem::directory_iterator()));
+}
 
 TEST(RawSocket, RepliesAreFramedOnLineFeedAndLimitedToTheBuffer) {
     LoopbackBench bench;
@@ -79,17 +92,53 @@ TEST(RawSocket, RefusedConnectNamesHostAndPortAndClosedPeerIsAnError) {
     const std::string refused = errorOf([&] { RawSocketLink("127.0.0.1", port, 1s); });
     EXPECT_NE(refused.find("127.0.0.1:" + std::to_string(port)), std::string::npos) << refused;
     EXPECT_NE(refused.find("refused"), std::string::npos) << refused;
+    const std::size_t before = openDescriptors();
+    for (int i = 0; i < 5; ++i) EXPECT_THROW(RawSocketLink("127.0.0.1", port, 1s), InstrumentError);
+    EXPECT_EQ(openDescriptors(), before) << "a failed connect leaves its socket open";
     EXPECT_THROW(RawSocketLink("no-such-host.invalid", 5025, 1s, 2s), InstrumentError);
+}
 
-    LoopbackBench bench;
-    auto link = bench.link(11);
-    bench.server.reset();  // stops and closes every connection
-    EXPECT_THROW(link.read(10), LinkFailure);
-    try {
-        for (int i = 0; i < 100; ++i) link.write("*IDN?\n");  // must not raise SIGPIPE
-    } catch (const LinkFailure& e) {
-        EXPECT_FALSE(e.timedOut());
+// A peer that closes or resets the connection: a failure of its own, not a timeout.
+TEST(RawSocket, PeerClosingOrResettingIsNoTimeout) {
+    const auto failure = [](auto call) -> std::string {
+        try {
+            call();
+        } catch (const LinkFailure& e) {
+            return (e.timedOut() ? "timeout: " : "") + std::string(e.what());
+        }
+        return "<no failure>";
+    };
+    for (const bool reset : {false, true}) {
+        std::atomic<bool> accepted = false;
+        auto peer = std::make_unique<ScriptedPeer>([&](ScriptedPeer& p, int fd) {
+            const linger abort{1, 0};
+            if (reset) ::setsockopt(fd, SOL_SOCKET, SO_LINGER, &abort, sizeof abort);
+            if (!reset) ::shutdown(fd, SHUT_WR);
+            accepted = true;
+            while (p.pause(10ms)) {
+            }
+        });
+        RawSocketLink link("127.0.0.1", peer->port(), 2s);
+        const std::string name = link.peer();
+        while (!accepted) std::this_thread::sleep_for(1ms);
+        if (reset) peer.reset();  // closes with the linger of 0: a reset
+        const std::string why = reset ? "read from " + name + " failed: Connection reset by peer"
+                                      : name + " closed the connection";
+        EXPECT_EQ(failure([&] { link.read(10); }), why);
+        EXPECT_FALSE(link.isOpen());
+        EXPECT_EQ(failure([&] { link.write("*IDN?\n"); }),
+                  "the connection to " + name + " is closed (" + why +
+                      "); clear the device or open it again");
     }
+}
+
+TEST(RawSocket, DestroyingTheLinkClosesTheConnection) {
+    std::atomic<bool> closed = false;
+    ScriptedPeer peer(
+        [&](ScriptedPeer& p, int fd) { closed = p.readLine(fd).empty() && !p.stopping(); });
+    { RawSocketLink link("127.0.0.1", peer.port(), 1s); }
+    for (int i = 0; i < 200 && !closed; ++i) std::this_thread::sleep_for(10ms);
+    EXPECT_TRUE(closed);
 }
 
 TEST(RawSocket, BracketedIpv6ResourceReachesTheLoopback) {
@@ -162,6 +211,10 @@ TEST_F(TransportBusTest, TimeoutSetsErrAndTimoKeepsTheBufferAndClosesUntilCleare
     EXPECT_EQ(read(d), "1\n");
     bus->writeText(42, "*IDN?\n");
     EXPECT_EQ(bus->status(), kErr);
+    const auto lines = trace.lines();
+    EXPECT_EQ(Lines(lines.end() - 3, lines.end()),
+              (Lines{"BUS 11 R \"1\\n\"", "BUS -1 W \"*IDN?\\n\"",
+                     "BUS -1 error invalid descriptor 42"}));
     EXPECT_EQ(bus->addressOf(42), -1);
 }
 

@@ -38,15 +38,18 @@ TEST(ReplyTail, LongIdentificationIsDrainedAndTracedBeforeTheErrorQuery) {
                              }));
 }
 
-// Answers "*IDN?" in two parts 200 ms apart (100 bytes, then 50 with the line feed), "*OPC?"
-// with "1".
+// Answers "*IDN?" in two parts 200 ms apart (100 bytes, then 50 with the line feed), "PAIR?"
+// the same with the reply "1" behind the rest in one segment, "TWO?" two lines in one segment,
+// "*OPC?" with "1".
 void splitReplies(ScriptedPeer& peer, int fd) {
     while (!peer.stopping()) {
         const std::string line = peer.readLine(fd);
-        if (line == "*IDN?\n") {
+        if (line == "*IDN?\n" || line == "PAIR?\n") {
             peer.sendText(fd, std::string(100, 'A'));
             peer.pause(200ms);
-            peer.sendText(fd, std::string(49, 'B') + "\n");
+            peer.sendText(fd, std::string(49, 'B') + (line == "PAIR?\n" ? "\n1\n" : "\n"));
+        } else if (line == "TWO?\n") {
+            peer.sendText(fd, "first\nsecond\n");
         } else if (line == "*OPC?\n") {
             peer.sendText(fd, "1\n");
         } else if (line.empty()) {
@@ -64,19 +67,30 @@ TEST(ReplyTail, WriteWaitsForARestStillOnItsWay) {
     link.write("*OPC?\n");
     EXPECT_EQ(link.read(100), "1\n");
     EXPECT_EQ(link.drainReplies(), 0u) << "a reply read to its end leaves nothing";
+    // A whole reply that came with the rest answers a query of its own: it stays.
+    link.write("PAIR?\n");
+    EXPECT_EQ(link.read(100), std::string(100, 'A'));
+    EXPECT_EQ(link.drainReplies(), 50u);
+    EXPECT_EQ(link.read(100), "1\n");
 }
 
-TEST(ReplyTail, ReadAfterClearGetsNoRestOfAnEarlierReply) {
-    ScriptedPeer peer(splitReplies);
-    RawSocketLink link("127.0.0.1", peer.port(), 500ms);
-    link.write("*IDN?\n");
-    EXPECT_EQ(link.read(100), std::string(100, 'A'));
-    link.clear();
-    try {
-        const std::string text = link.read(100);
-        ADD_FAILURE() << "nothing was asked since the clear, yet read \"" << text << "\"";
-    } catch (const LinkFailure& e) {
-        EXPECT_TRUE(e.timedOut()) << e.what();
+// Clear drops the rest of a reply still on its way and whole replies already received.
+TEST(ReplyTail, ReadAfterClearGetsNothingOfEarlierReplies) {
+    for (const auto& [query, first] :
+         {std::pair<std::string, std::string>{"*IDN?\n", std::string(100, 'A')},
+          {"TWO?\n", "first\n"}}) {
+        SCOPED_TRACE(query);
+        ScriptedPeer peer(splitReplies);
+        RawSocketLink link("127.0.0.1", peer.port(), 500ms);
+        link.write(query);
+        EXPECT_EQ(link.read(100), first);
+        link.clear();
+        try {
+            const std::string text = link.read(100);
+            ADD_FAILURE() << "nothing was asked since the clear, yet read \"" << text << "\"";
+        } catch (const LinkFailure& e) {
+            EXPECT_TRUE(e.timedOut()) << e.what();
+        }
     }
 }
 
