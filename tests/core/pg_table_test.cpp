@@ -62,8 +62,11 @@ TEST(PGTable, MasterAcceptsBooleanTextsAndNumbers) {
         t.cell(0, Master) = cell;
         EXPECT_EQ(t.readRow(0).master, expected);
     }
-    t.cell(0, Master) = std::string("yes");
-    EXPECT_THROW(t.readRow(0), std::invalid_argument);
+    // A word of the same length is no boolean.
+    for (const char* bad : {"yes", "Trux", "Falsy"}) {
+        t.cell(0, Master) = std::string(bad);
+        EXPECT_THROW(t.readRow(0), std::invalid_argument) << bad;
+    }
     // "True" is only a boolean in the Master column.
     t.cell(0, Master) = kFalse;
     t.cell(0, Enabled) = std::string("True");

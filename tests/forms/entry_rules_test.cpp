@@ -90,10 +90,12 @@ TEST_F(EntryRules, DelaysArePulledBackTo340Degrees) {
     EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 9.4e-6);
 
     // A PRF change pulls back the enabled delays only: 372 degrees -> 340 / (110 kHz x 360).
-    form.VexoEdit_delay[2].setValue(9.4e-6);
-    form.VexoEdit_delay[2].setEnabled(false);
+    for (int r : {0, 2, 4}) {
+        form.VexoEdit_delay[r].setValue(9.4e-6);
+        form.VexoEdit_delay[r].setEnabled(r != 2);
+    }
     typePrf(110000);
-    EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 8.585e-6);
+    for (int r : {0, 1, 4}) EXPECT_DOUBLE_EQ(form.VexoEdit_delay[r].value(), 8.585e-6) << r;
     EXPECT_DOUBLE_EQ(form.VexoEdit_delay[2].value(), 9.4e-6);
 }
 
@@ -105,6 +107,9 @@ TEST_F(EntryRules, WidthIsNormalisedAndStepsUpOnlyFromAStep) {
 }
 
 TEST_F(EntryRules, RowsOnTheSameExternalOutputFollowEachOther) {
+    state.SWriteRow(4, state.SReadRow(0));
+    EXPECT_EQ(form.sharedRows(0), std::vector<int>{4});
+    EXPECT_EQ(form.sharedRows(4), std::vector<int>{0});
     state.SWriteRow(3, state.SReadRow(1));
     EXPECT_EQ(form.sharedRows(1), std::vector<int>{3});
     EXPECT_EQ(form.sharedRows(3), std::vector<int>{1});
