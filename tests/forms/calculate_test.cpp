@@ -161,7 +161,7 @@ TEST_F(Calculate, ExternalPathPassesRoundedIfbwAndConverterDelay) {
 }
 
 TEST_F(Calculate, InternalGatedGetsGateRowsOnly) {
-    load(twoPortInternal());
+    load(kTwoPortInternal);
     row(0, 8e-6, 9e-6);
     row(1, 1e-6);
     row(2, 1e-6, 2e-6);
@@ -180,7 +180,7 @@ TEST_F(Calculate, InternalGatedGetsGateRowsOnly) {
 }
 
 TEST_F(Calculate, InternalWithoutSwGatingUsesThePlainSolveAndSlowClock) {
-    load(analyzer("KT622A", "K71 M81", 2, 1, "3"));
+    load(kTwoPortSlowClock);
     form.m_NoSWGating_Click();
     form.b_calculate_Click();
     EXPECT_EQ(solver.calls, std::vector<std::string>{"SolveInternal"});
@@ -205,24 +205,33 @@ TEST_F(Calculate, ThrowingSolverIsReportedAndChangesNothing) {
     EXPECT_EQ(ui.pointers, (std::vector<Pointer>{Pointer::Busy, Pointer::Normal}));
 }
 
-TEST_F(Calculate, NonFinitePrfFromTheSolverIsAnError) {
-    solver.prf = std::nan("");
-    form.b_calculate_Click();
-    ASSERT_EQ(ui.messages.size(), 1u);
-    EXPECT_NE(ui.messages[0].find("invalid PRF"), std::string::npos);
-    expectUnsolved(ui.messages);
-    EXPECT_EQ(state.PRF, 0.0);
+TEST_F(Calculate, NonFinitePrfFromTheSolverIsAnErrorOnBothPaths) {
+    for (const char* model : {kTwoPortExternal, kTwoPortInternal}) {
+        SCOPED_TRACE(model);
+        load(model);
+        ui.messages.clear();
+        ui.kinds.clear();
+        solver.prf = std::nan("");
+        form.b_calculate_Click();
+        expectUnsolved({"The timing solver gave an invalid PRF (NaN Hz)."});
+        EXPECT_EQ(state.PRF, 0.0);
+    }
 }
 
 TEST(CalculateWithoutSolver, MissingSolverIsReported) {
-    PulsedModule state;
-    FakeBench bench;
-    ScriptedInteraction ui;
-    MainForm form(state, bench, ui, [] { return std::unique_ptr<TimingSolver>(); });
-    form.Form_Load();
-    form.b_calculate_Click();
-    EXPECT_EQ(ui.messages, std::vector<std::string>{"The timing solver is not available."});
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
+    // No factory, and a factory that gives no solver.
+    for (const MainForm::SolverFactory& factory :
+         {MainForm::SolverFactory{},
+          MainForm::SolverFactory{[] { return std::unique_ptr<TimingSolver>(); }}}) {
+        PulsedModule state;
+        ModelBench bench;
+        ScriptedInteraction ui;
+        MainForm form(state, bench, ui, factory);
+        form.Form_Load();
+        form.b_calculate_Click();
+        EXPECT_EQ(ui.messages, std::vector<std::string>{"The timing solver is not available."});
+        EXPECT_TRUE(isTrue(state.NeedsCalculation));
+    }
 }
 
 TEST_F(Calculate, DutyCycleListsEnabledRows) {

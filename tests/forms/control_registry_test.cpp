@@ -55,7 +55,7 @@ TEST_F(Registry, RefusesWhatThePersonCouldNotReachAndChangesNothing) {
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.reason);
-        load(twoPortExternal());
+        load(kTwoPortExternal);
         changes = 0;
         c.setUp(form);
         EXPECT_EQ(c.act(controls()), c.reason);
@@ -97,7 +97,7 @@ TEST_F(Registry, UnbuiltActionsSayNotAvailableUntilAHandlerIsPlugged) {
 
     int applied = 0;
     controls().setHandler("b_apply", [&] { ++applied; });
-    load(twoPortExternal());  // a new start-up declares the table again; the plug stays
+    load(kTwoPortExternal);  // a new start-up declares the table again; the plug stays
     form.b_calculate_Click();
     ASSERT_EQ(controls().click("b_apply"), std::nullopt);
     EXPECT_EQ(applied, 1);
@@ -111,7 +111,7 @@ TEST_F(Registry, NamesAreCheckedAndRowsFollowTheAnalyzer) {
         EXPECT_THROW(controls().field(bad), std::invalid_argument) << bad;
     }
     EXPECT_EQ(controls().item("VexoEdit_width").rowCount(), 5);
-    load(fourPortThreeSources());
+    load(kFourPortThreeSources);
     EXPECT_EQ(controls().item("VexoEdit_width").rowCount(), 6);
     EXPECT_EQ(controls().describe("lbl_gate(5)"), "R IF Gate :");
     // The sixth row's field runs its rule through the table as the others do.

@@ -135,7 +135,7 @@ TEST_F(EntryRules, RowsOnTheSameExternalOutputFollowEachOther) {
 }
 
 TEST_F(EntryRules, InternalGeneratorsShareByInternalOutputOnly) {
-    load(twoPortInternal());
+    load(kTwoPortInternal);
     ASSERT_EQ(state.UseInternalPG, kChecked);
     // Row 0 drives output 1, every gate row output 2, whatever their GPIB settings.
     EXPECT_EQ(form.sharedRows(2), (std::vector<int>{1, 3, 4}));
