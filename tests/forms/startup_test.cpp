@@ -53,6 +53,10 @@ TEST_F(Startup, SixthRowIsAFullRow) {
     load(kFourPortThreeSources);
     EXPECT_EQ(form.controls().fieldGeometry("VexoEdit_width(5)").top, 2280);
     EXPECT_EQ(form.b_close.geometry.top, 6240);
+    // The bottom buttons in their slots, first and last.
+    const std::pair<const Control&, int> lefts[] = {
+        {form.b_PulseProfile, 120}, {form.b_min, 3180}, {form.b_close, 4200}};
+    for (const auto& [button, left] : lefts) EXPECT_EQ(button.geometry.left, left) << button.name;
     type(form.VexoEdit_width[5], 2e-6);
     EXPECT_EQ(form.VexoEdit_width[5].value(), 2e-6);
 }
