@@ -113,6 +113,7 @@ TEST_F(Registry, NamesAreCheckedAndRowsFollowTheAnalyzer) {
         EXPECT_THROW(controls().field(bad), std::invalid_argument) << bad;
     }
     EXPECT_EQ(controls().item("VexoEdit_width").rowCount(), 5);
+    EXPECT_FALSE(controls().checked("b_calculate"));  // a button has no check mark to show
     load(kFourPortThreeSources);
     EXPECT_EQ(controls().item("VexoEdit_width").rowCount(), 6);
     EXPECT_EQ(controls().describe("lbl_gate(5)"), "R IF Gate :");
