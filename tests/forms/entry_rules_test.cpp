@@ -44,7 +44,8 @@ TEST_F(EntryRules, PrfKeepsFourOrFiveCharactersAndStepsUpOnlyAfterAStep) {
         {10001, T, 10000},
         {10001, S, 10010},
         {123.41, S, 123.5},
-        {1001, S, 1001},  // a four-character text is never stepped up
+        {0.56781, S, 0.5671},  // below 1 Hz the step is a ten-thousandth
+        {1001, S, 1001},       // a four-character text is never stepped up
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(testing::Message() << c.entered << (c.how == S ? " stepped" : " typed"));
@@ -110,6 +111,11 @@ TEST_F(EntryRules, RowsOnTheSameExternalOutputFollowEachOther) {
     state.SWriteRow(4, state.SReadRow(0));
     EXPECT_EQ(form.sharedRows(0), std::vector<int>{4});
     EXPECT_EQ(form.sharedRows(4), std::vector<int>{0});
+    // A table row beyond the window's rows shares with nobody.
+    state.Table.resize(6);
+    state.SWriteRow(5, state.SReadRow(0));
+    EXPECT_EQ(form.sharedRows(0), std::vector<int>{4});
+    state.Table.resize(5);
     state.SWriteRow(3, state.SReadRow(1));
     EXPECT_EQ(form.sharedRows(1), std::vector<int>{3});
     EXPECT_EQ(form.sharedRows(3), std::vector<int>{1});
