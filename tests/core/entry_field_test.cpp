@@ -3,6 +3,7 @@
 #include <cmath>
 #include <stdexcept>
 #include <tuple>
+#include <vector>
 
 #include "core/entry_field.h"
 
@@ -34,124 +35,61 @@ TEST(UnitList, ParsesPairsAndRefusesMalformedLists) {
 TEST(EntryFieldParse, UnitSpellingTable) {
     struct Case {
         const char* list;
-        const char* spelling;
         double factor;
+        std::vector<const char*> spellings;
     };
     const Case cases[] = {
         // Seconds.
-        {units::kSeconds, "", 1},
-        {units::kSeconds, "sec", 1},
-        {units::kSeconds, "s", 1},
-        {units::kSeconds, "msec", 1e-3},
-        {units::kSeconds, "ms", 1e-3},
-        {units::kSeconds, "usec", 1e-6},
-        {units::kSeconds, "us", 1e-6},
-        {units::kSeconds, "\xC2\xB5s", 1e-6},
-        {units::kSeconds, "\xCE\xBCsec", 1e-6},
-        {units::kSeconds, "nsec", 1e-9},
-        {units::kSeconds, "ns", 1e-9},
-        {units::kSeconds, "psec", 1e-12},
-        {units::kSeconds, "ps", 1e-12},
-        {units::kSeconds, "p", 1e-12},
-        {units::kSeconds, "n", 1e-9},
-        {units::kSeconds, "u", 1e-6},
-        {units::kSeconds, "m", 1e-3},
-        {units::kSeconds, "k", 1e3},
-        {units::kSeconds, "M", 1e6},
-        {units::kSeconds, "G", 1e9},
-        {units::kSeconds, "ks", 1e3},
-        {units::kSeconds, "Ms", 1e6},
-        {units::kSeconds, "Msec", 1e6},
-        {units::kSeconds, "Gsec", 1e9},
-        {units::kSeconds, "S", 1},
-        {units::kSeconds, "SEC", 1},
-        {units::kSeconds, "MS", 1e-3},
-        {units::kSeconds, "MSEC", 1e-3},
-        {units::kSeconds, "mSec", 1e-3},
-        {units::kSeconds, "US", 1e-6},
-        {units::kSeconds, "NS", 1e-9},
-        {units::kSeconds, "PS", 1e-12},
-        {units::kSeconds, "K", 1e3},
-        {units::kSeconds, "KS", 1e3},
-        {units::kSeconds, "g", 1e9},
-        {units::kSeconds, "U", 1e-6},
-        {units::kSeconds, "Hz", 0},
-        {units::kSeconds, "mm", 0},
-        {units::kSeconds, "secs", 0},
-        {units::kSeconds, "m s", 0},
-        {units::kSeconds, ".", 0},
-        {units::kSeconds, "x", 0},
+        {units::kSeconds, 1, {"", "sec", "s", "S", "SEC"}},
+        {units::kSeconds, 1e-3, {"msec", "ms", "m", "MS", "MSEC", "mSec"}},
+        {units::kSeconds, 1e-6, {"usec", "us", "\xC2\xB5s", "\xCE\xBCsec", "u", "US", "U"}},
+        {units::kSeconds, 1e-9, {"nsec", "ns", "n", "NS"}},
+        {units::kSeconds, 1e-12, {"psec", "ps", "p", "PS"}},
+        {units::kSeconds, 1e3, {"k", "ks", "K", "KS"}},
+        {units::kSeconds, 1e6, {"M", "Ms", "Msec"}},
+        {units::kSeconds, 1e9, {"G", "Gsec", "g"}},
+        {units::kSeconds, 0, {"Hz", "mm", "secs", "m s", ".", "x"}},
         // Hertz.
-        {units::kHertz, "Hz", 1},
-        {units::kHertz, "kHz", 1e3},
-        {units::kHertz, "MHz", 1e6},
-        {units::kHertz, "GHz", 1e9},
-        {units::kHertz, "mHz", 1e-3},
-        {units::kHertz, "uHz", 1e-6},
-        {units::kHertz, "m", 1e-3},
-        {units::kHertz, "M", 1e6},
-        {units::kHertz, "k", 1e3},
-        {units::kHertz, "HZ", 1},
-        {units::kHertz, "hz", 1},
-        {units::kHertz, "KHZ", 1e3},
-        {units::kHertz, "khz", 1e3},
-        {units::kHertz, "MHZ", 1e6},
-        {units::kHertz, "mhz", 1e6},
-        {units::kHertz, "mHZ", 1e6},
-        {units::kHertz, "GHZ", 1e9},
-        {units::kHertz, "UHZ", 1e-6},
-        {units::kHertz, "K", 1e3},
-        {units::kHertz, "s", 0},
-        {units::kHertz, "ms", 0},
-        {units::kHertz, "Hzz", 0},
-        {units::kHertz, "kk", 0},
+        {units::kHertz, 1, {"Hz", "HZ", "hz"}},
+        {units::kHertz, 1e3, {"kHz", "k", "KHZ", "khz", "K"}},
+        {units::kHertz, 1e6, {"MHz", "M", "MHZ", "mhz", "mHZ"}},
+        {units::kHertz, 1e9, {"GHz", "GHZ"}},
+        {units::kHertz, 1e-3, {"mHz", "m"}},
+        {units::kHertz, 1e-6, {"uHz", "UHZ"}},
+        {units::kHertz, 0, {"s", "ms", "Hzz", "kk"}},
         // Volts.
-        {units::kVolts, "V", 1},
-        {units::kVolts, "mV", 1e-3},
-        {units::kVolts, "kV", 1e3},
-        {units::kVolts, "MV", 1e6},
-        {units::kVolts, "uV", 1e-6},
-        {units::kVolts, "m", 1e-3},
-        {units::kVolts, "v", 1},
-        {units::kVolts, "mv", 1e-3},
-        {units::kVolts, "Mv", 1e-3},
-        {units::kVolts, "KV", 1e3},
-        {units::kVolts, "Vm", 0},
-        {units::kVolts, "Hz", 0},
+        {units::kVolts, 1, {"V", "v"}},
+        {units::kVolts, 1e-3, {"mV", "m", "mv", "Mv"}},
+        {units::kVolts, 1e3, {"kV", "KV"}},
+        {units::kVolts, 1e6, {"MV"}},
+        {units::kVolts, 1e-6, {"uV"}},
+        {units::kVolts, 0, {"Vm", "Hz"}},
         // Ohms: "k" and "M" are listed names.
-        {units::kOhms, "ohm", 1},
-        {units::kOhms, "k", 1e3},
-        {units::kOhms, "M", 1e6},
-        {units::kOhms, "m", 1e-3},
-        {units::kOhms, "kohm", 1e3},
-        {units::kOhms, "Mohm", 1e6},
-        {units::kOhms, "mohm", 1e-3},
-        {units::kOhms, "OHM", 1},
-        {units::kOhms, "K", 1e3},
-        {units::kOhms, "KOHM", 1e3},
-        {units::kOhms, "MOHM", 1e6},
-        {units::kOhms, "mOHM", 1e6},
-        {units::kOhms, "s", 0},
+        {units::kOhms, 1, {"ohm", "OHM"}},
+        {units::kOhms, 1e3, {"k", "kohm", "K", "KOHM"}},
+        {units::kOhms, 1e6, {"M", "Mohm", "MOHM", "mOHM"}},
+        {units::kOhms, 1e-3, {"m", "mohm"}},
+        {units::kOhms, 0, {"s"}},
         // Plain numbers: prefix letters only.
-        {units::kPlain, "", 1},
-        {units::kPlain, "k", 1e3},
-        {units::kPlain, "m", 1e-3},
-        {units::kPlain, "M", 1e6},
-        {units::kPlain, "K", 1e3},
-        {units::kPlain, ".", 0},
-        {units::kPlain, "Hz", 0},
+        {units::kPlain, 1, {""}},
+        {units::kPlain, 1e3, {"k", "K"}},
+        {units::kPlain, 1e-3, {"m"}},
+        {units::kPlain, 1e6, {"M"}},
+        {units::kPlain, 0, {".", "Hz"}},
     };
     for (const auto& c : cases) {
-        const EntryField f("f", 0, 0, 1e300, 0, c.list);
-        const auto p = f.parse(std::string("2.5 ") + c.spelling);
-        if (c.factor == 0) {
-            EXPECT_EQ(p.error.rfind("unknown unit '" + std::string(c.spelling) + "'", 0), 0u)
-                << c.list << " / " << c.spelling << ": " << p.error;
-        } else {
-            // Exactly the double nearest 2.5 x factor, as if typed in the base unit.
-            EXPECT_EQ(p.value,
-                      std::stod("2.5e" + std::to_string(std::lround(std::log10(c.factor)))))
-                << c.list << " / " << c.spelling;
+        for (const char* spelling : c.spellings) {
+            const EntryField f("f", 0, 0, 1e300, 0, c.list);
+            const auto p = f.parse(std::string("2.5 ") + spelling);
+            if (c.factor == 0) {
+                EXPECT_EQ(p.error.rfind("unknown unit '" + std::string(spelling) + "'", 0), 0u)
+                    << c.list << " / " << spelling << ": " << p.error;
+            } else {
+                // Exactly the double nearest 2.5 x factor, as if typed in the base unit.
+                EXPECT_EQ(p.value,
+                          std::stod("2.5e" + std::to_string(std::lround(std::log10(c.factor)))))
+                    << c.list << " / " << spelling;
+            }
         }
     }
 }

@@ -23,6 +23,7 @@ TEST(SNormalizeValue, SignificantDigitsAndTheStepUp) {
         {1234.5, false, 1234.0},
         // Large values keep four significant digits instead of losing integer digits.
         {987654321.0, false, 987600000.0},
+        {12345.6, false, 12340.0},
         // A last digit 1 after a step moves up by one in the fourth digit; typed values do not.
         {0.0012341, true, 0.001244},
         {0.0012341, false, 0.001234},

@@ -3,6 +3,7 @@
 #include <cmath>
 #include <stdexcept>
 #include <string>
+#include <utility>
 
 #include "core/numeric.h"
 #include "core/pg_table.h"
@@ -31,6 +32,8 @@ TEST(PGTable, WriterStoresColumnTypesAndReaderGivesThemBack) {
     EXPECT_THROW(t.writeRow(5, r), std::out_of_range);
     EXPECT_THROW(t.writeRow(-1, r), std::out_of_range);
     EXPECT_THROW(t.cell(0, 9), std::out_of_range);
+    EXPECT_THROW(t.cell(5, 0), std::out_of_range);
+    EXPECT_THROW(std::as_const(t).cell(-1, 0), std::out_of_range);
     EXPECT_THROW(PGTable().readRow(0), std::out_of_range);
     EXPECT_THROW(t.resize(-1), std::invalid_argument);
 }
@@ -62,8 +65,11 @@ TEST(PGTable, MasterAcceptsBooleanTextsAndNumbers) {
         t.cell(0, Master) = cell;
         EXPECT_EQ(t.readRow(0).master, expected);
     }
-    t.cell(0, Master) = std::string("yes");
-    EXPECT_THROW(t.readRow(0), std::invalid_argument);
+    // A word of the same length is no boolean.
+    for (const char* bad : {"yes", "Trux", "Falsy"}) {
+        t.cell(0, Master) = std::string(bad);
+        EXPECT_THROW(t.readRow(0), std::invalid_argument) << bad;
+    }
     // "True" is only a boolean in the Master column.
     t.cell(0, Master) = kFalse;
     t.cell(0, Enabled) = std::string("True");

@@ -38,6 +38,9 @@ TEST(DefaultSolverExternal, FixedPrfMovesTheIfBandwidthFreePrfMovesThePrf) {
         {external(5000, 3000, false), 6000, 3000, 2},  // a whole number of IF bandwidths
         {external(100, 3000, false), 3000, 3000, 1},   // at least one period per reading
         {external(164e6, 10000, false), 164e6, 10000, 16400},
+        // The ends of the PRF range are solutions.
+        {external(0.001, 1, false), 1, 1, 1},
+        {external(165e6, 10000, true), 165e6, 10000, 16500},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(testing::Message() << c.in.prf << " Hz, " << c.in.ifbwHz << " Hz");
@@ -82,6 +85,8 @@ TEST(DefaultSolverInternal, PeriodOnClockTicks) {
     EXPECT_EQ(free.list3, (List{10000, 2}));
     // 100e6 / 7000 = 14285.7 -> 14286 ticks
     EXPECT_DOUBLE_EQ(s->SolveInternal(internal(7000, 7000, false)).prf, 100e6 / 14286);
+    // A one-tick period is the shortest there is.
+    EXPECT_EQ(s->SolveInternal(internal(1e6, 10000, true, 1e6)).list3, (List{1, 100}));
 
     for (const InternalRequest& in :
          {internal(0, 500, true), internal(5000, 0.5, true), internal(5000, 500, true, 0.0),

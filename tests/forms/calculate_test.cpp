@@ -67,16 +67,30 @@ TEST_F(Calculate, ScansLookAtEnabledRowsAfterTheFirst) {
     EXPECT_EQ(form.FHighestGateDelay(), 1e-6);
     form.VexoEdit_delay[3].setValue(2e-6);
     EXPECT_EQ(form.FHighestGateDelay(), 2e-6);
+    // The last row counts too.
+    row(4, 0.1e-6, 5e-6);
+    EXPECT_EQ(form.FMinPulseWidth(), 0.1e-6);
+    EXPECT_EQ(form.FHighestGateDelay(), 5e-6);
+    row(4, 8e-6);
+    EXPECT_EQ(form.FMaxPulseWidth(), 8e-6);
+    EXPECT_EQ(form.FMaxGateWidth(), 8e-6);
 }
 
-TEST_F(Calculate, AutoGainAtThe50kHzBoundary) {
-    row(0, 500e-9);
-    state.PRF = 50000;
-    EXPECT_EQ(form.FAutoGain(), 1);
-    state.PRF = 50001;
-    EXPECT_EQ(form.FAutoGain(), 0);
-    row(2, 50e-9);
-    EXPECT_EQ(form.FAutoGain(), 1);
+TEST_F(Calculate, AutoGainAtThe50kHzAnd100nsBoundaries) {
+    const struct {
+        double prf, narrowest;
+        int gain;
+    } cases[] = {{50000, 0.999e-6, 1},
+                 {50000, 1e-6, 0},
+                 {50001, 0.999e-6, 0},
+                 {50001, 1e-7, 0},
+                 {50001, 99e-9, 1}};
+    for (const auto& c : cases) {
+        SCOPED_TRACE(testing::Message() << c.prf << " Hz, " << c.narrowest << " s");
+        state.PRF = c.prf;
+        for (int r = 0; r < 5; ++r) row(r, r == 4 ? c.narrowest : 2e-6);
+        EXPECT_EQ(form.FAutoGain(), c.gain);
+    }
 }
 
 TEST_F(Calculate, SecondPressWithoutChangeDoesNotSolveAgain) {
@@ -147,7 +161,7 @@ TEST_F(Calculate, ExternalPathPassesRoundedIfbwAndConverterDelay) {
 }
 
 TEST_F(Calculate, InternalGatedGetsGateRowsOnly) {
-    load(twoPortInternal());
+    load(kTwoPortInternal);
     row(0, 8e-6, 9e-6);
     row(1, 1e-6);
     row(2, 1e-6, 2e-6);
@@ -166,7 +180,7 @@ TEST_F(Calculate, InternalGatedGetsGateRowsOnly) {
 }
 
 TEST_F(Calculate, InternalWithoutSwGatingUsesThePlainSolveAndSlowClock) {
-    load(analyzer("KT622A", "K71 M81", 2, 1, "3"));
+    load(kTwoPortSlowClock);
     form.m_NoSWGating_Click();
     form.b_calculate_Click();
     EXPECT_EQ(solver.calls, std::vector<std::string>{"SolveInternal"});
@@ -191,36 +205,47 @@ TEST_F(Calculate, ThrowingSolverIsReportedAndChangesNothing) {
     EXPECT_EQ(ui.pointers, (std::vector<Pointer>{Pointer::Busy, Pointer::Normal}));
 }
 
-TEST_F(Calculate, NonFinitePrfFromTheSolverIsAnError) {
-    solver.prf = std::nan("");
-    form.b_calculate_Click();
-    ASSERT_EQ(ui.messages.size(), 1u);
-    EXPECT_NE(ui.messages[0].find("invalid PRF"), std::string::npos);
-    expectUnsolved(ui.messages);
-    EXPECT_EQ(state.PRF, 0.0);
+TEST_F(Calculate, NonFinitePrfFromTheSolverIsAnErrorOnBothPaths) {
+    for (const char* model : {kTwoPortExternal, kTwoPortInternal}) {
+        SCOPED_TRACE(model);
+        load(model);
+        ui.messages.clear();
+        ui.kinds.clear();
+        solver.prf = std::nan("");
+        form.b_calculate_Click();
+        expectUnsolved({"The timing solver gave an invalid PRF (NaN Hz)."});
+        EXPECT_EQ(state.PRF, 0.0);
+    }
 }
 
 TEST(CalculateWithoutSolver, MissingSolverIsReported) {
-    PulsedModule state;
-    FakeBench bench;
-    ScriptedInteraction ui;
-    MainForm form(state, bench, ui, [] { return std::unique_ptr<TimingSolver>(); });
-    form.Form_Load();
-    form.b_calculate_Click();
-    EXPECT_EQ(ui.messages, std::vector<std::string>{"The timing solver is not available."});
-    EXPECT_TRUE(isTrue(state.NeedsCalculation));
+    // No factory, and a factory that gives no solver.
+    for (const MainForm::SolverFactory& factory :
+         {MainForm::SolverFactory{},
+          MainForm::SolverFactory{[] { return std::unique_ptr<TimingSolver>(); }}}) {
+        PulsedModule state;
+        ModelBench bench;
+        ScriptedInteraction ui;
+        MainForm form(state, bench, ui, factory);
+        form.Form_Load();
+        form.b_calculate_Click();
+        EXPECT_EQ(ui.messages, std::vector<std::string>{"The timing solver is not available."});
+        EXPECT_TRUE(isTrue(state.NeedsCalculation));
+    }
 }
 
 TEST_F(Calculate, DutyCycleListsEnabledRows) {
     typePrf(100000);
-    for (int r : {0, 2, 3, 4}) form.VexoEdit_width[r].setEnabled(false);
+    for (int r : {0, 2, 3}) form.VexoEdit_width[r].setEnabled(false);
     row(1, 1.25e-6);
+    row(4, 2.5e-6);
     form.b_calculate_Click();
-    EXPECT_EQ(form.lbl_DutyCycle.caption, "A IF Gate :12.5%\n");
+    EXPECT_EQ(form.lbl_DutyCycle.caption, "A IF Gate :12.5%\nR2 IF Gate :25%\n");
 
     row(0, 1.234567e-6);
     form.SUpdateDutyCycle();
-    EXPECT_EQ(form.lbl_DutyCycle.caption, "Source Modulation :12.3457%\nA IF Gate :12.5%\n");
+    EXPECT_EQ(form.lbl_DutyCycle.caption,
+              "Source Modulation :12.3457%\nA IF Gate :12.5%\nR2 IF Gate :25%\n");
 }
 
 }  // namespace

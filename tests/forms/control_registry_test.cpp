@@ -55,7 +55,7 @@ TEST_F(Registry, RefusesWhatThePersonCouldNotReachAndChangesNothing) {
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.reason);
-        load(twoPortExternal());
+        load(kTwoPortExternal);
         changes = 0;
         c.setUp(form);
         EXPECT_EQ(c.act(controls()), c.reason);
@@ -72,21 +72,23 @@ TEST_F(Registry, OperationsRunTheControlsRuleAndNotifyOnce) {
     EXPECT_DOUBLE_EQ(form.VexoEdit_pri.value(), 1e-4);
     ASSERT_EQ(controls().step("VexoEdit_width(1)", -1), std::nullopt);
     EXPECT_LT(form.VexoEdit_width[1].value(), 1e-6);
+    ASSERT_EQ(controls().enterText("VexoEdit_width(0)", "1.23456us"), std::nullopt);
+    EXPECT_DOUBLE_EQ(form.VexoEdit_width[0].value(), 1.234e-6);  // the first row's rule ran
     ASSERT_EQ(controls().click("chk_FixedPRF"), std::nullopt);
     EXPECT_FALSE(isTrue(state.FixedPRF));
     ASSERT_EQ(controls().setChecked("m_NoSWGating", true), std::nullopt);
     EXPECT_TRUE(form.m_NoSWGating.checked);
     ASSERT_EQ(controls().click("b_calculate"), std::nullopt);
     EXPECT_TRUE(form.b_apply.enabled);
-    EXPECT_EQ(changes, 5);
+    EXPECT_EQ(changes, 6);
     // A control that already shows the asked state is left alone.
     EXPECT_EQ(controls().setChecked("m_NoSWGating", true), std::nullopt);
     EXPECT_EQ(controls().setChecked("chk_FixedPRF", false), std::nullopt);
     EXPECT_TRUE(form.m_NoSWGating.checked);
-    EXPECT_EQ(changes, 5);
+    EXPECT_EQ(changes, 6);
     // A refused entry is the field's own reason.
     EXPECT_EQ(controls().enterText("VexoEdit_prf", "1G"), "1 GHz is outside 0.001 Hz to 165 MHz");
-    EXPECT_EQ(changes, 5);
+    EXPECT_EQ(changes, 6);
 }
 
 TEST_F(Registry, UnbuiltActionsSayNotAvailableUntilAHandlerIsPlugged) {
@@ -96,7 +98,7 @@ TEST_F(Registry, UnbuiltActionsSayNotAvailableUntilAHandlerIsPlugged) {
 
     int saved = 0;
     controls().setHandler("b_save", [&] { ++saved; });
-    load(twoPortExternal());  // a new start-up declares the table again; the plug stays
+    load(kTwoPortExternal);  // a new start-up declares the table again; the plug stays
     ASSERT_EQ(controls().click("b_save"), std::nullopt);
     EXPECT_EQ(saved, 1);
     EXPECT_EQ(ui.messages.size(), 1u);
@@ -109,7 +111,8 @@ TEST_F(Registry, NamesAreCheckedAndRowsFollowTheAnalyzer) {
         EXPECT_THROW(controls().field(bad), std::invalid_argument) << bad;
     }
     EXPECT_EQ(controls().item("VexoEdit_width").rowCount(), 5);
-    load(fourPortThreeSources());
+    EXPECT_FALSE(controls().checked("b_calculate"));  // a button has no check mark to show
+    load(kFourPortThreeSources);
     EXPECT_EQ(controls().item("VexoEdit_width").rowCount(), 6);
     EXPECT_EQ(controls().describe("lbl_gate(5)"), "R IF Gate :");
     // The sixth row's field runs its rule through the table as the others do.

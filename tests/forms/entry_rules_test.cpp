@@ -44,7 +44,8 @@ TEST_F(EntryRules, PrfKeepsFourOrFiveCharactersAndStepsUpOnlyAfterAStep) {
         {10001, T, 10000},
         {10001, S, 10010},
         {123.41, S, 123.5},
-        {1001, S, 1001},  // a four-character text is never stepped up
+        {0.56781, S, 0.5671},  // below 1 Hz the step is a ten-thousandth
+        {1001, S, 1001},       // a four-character text is never stepped up
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(testing::Message() << c.entered << (c.how == S ? " stepped" : " typed"));
@@ -90,10 +91,12 @@ TEST_F(EntryRules, DelaysArePulledBackTo340Degrees) {
     EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 9.4e-6);
 
     // A PRF change pulls back the enabled delays only: 372 degrees -> 340 / (110 kHz x 360).
-    form.VexoEdit_delay[2].setValue(9.4e-6);
-    form.VexoEdit_delay[2].setEnabled(false);
+    for (int r : {0, 2, 4}) {
+        form.VexoEdit_delay[r].setValue(9.4e-6);
+        form.VexoEdit_delay[r].setEnabled(r != 2);
+    }
     typePrf(110000);
-    EXPECT_DOUBLE_EQ(form.VexoEdit_delay[1].value(), 8.585e-6);
+    for (int r : {0, 1, 4}) EXPECT_DOUBLE_EQ(form.VexoEdit_delay[r].value(), 8.585e-6) << r;
     EXPECT_DOUBLE_EQ(form.VexoEdit_delay[2].value(), 9.4e-6);
 }
 
@@ -105,6 +108,14 @@ TEST_F(EntryRules, WidthIsNormalisedAndStepsUpOnlyFromAStep) {
 }
 
 TEST_F(EntryRules, RowsOnTheSameExternalOutputFollowEachOther) {
+    state.SWriteRow(4, state.SReadRow(0));
+    EXPECT_EQ(form.sharedRows(0), std::vector<int>{4});
+    EXPECT_EQ(form.sharedRows(4), std::vector<int>{0});
+    // A table row beyond the window's rows shares with nobody.
+    state.Table.resize(6);
+    state.SWriteRow(5, state.SReadRow(0));
+    EXPECT_EQ(form.sharedRows(0), std::vector<int>{4});
+    state.Table.resize(5);
     state.SWriteRow(3, state.SReadRow(1));
     EXPECT_EQ(form.sharedRows(1), std::vector<int>{3});
     EXPECT_EQ(form.sharedRows(3), std::vector<int>{1});
@@ -130,7 +141,7 @@ TEST_F(EntryRules, RowsOnTheSameExternalOutputFollowEachOther) {
 }
 
 TEST_F(EntryRules, InternalGeneratorsShareByInternalOutputOnly) {
-    load(twoPortInternal());
+    load(kTwoPortInternal);
     ASSERT_EQ(state.UseInternalPG, kChecked);
     // Row 0 drives output 1, every gate row output 2, whatever their GPIB settings.
     EXPECT_EQ(form.sharedRows(2), (std::vector<int>{1, 3, 4}));
@@ -160,7 +171,12 @@ TEST_F(EntryRules, NoSwGatingKeepsApplyOnAWidthChange) {
 }
 
 TEST_F(EntryRules, RowsOutsideTheWindowAreRefused) {
-    EXPECT_THROW(form.widthRule(5), std::out_of_range);
+    try {
+        form.widthRule(5);
+        ADD_FAILURE() << "row 5 taken";
+    } catch (const std::out_of_range& e) {
+        EXPECT_STREQ(e.what(), "row 5 is outside the rows 0 to 4");
+    }
     EXPECT_THROW(form.delayRule(-1), std::out_of_range);
     EXPECT_TRUE(form.sharedRows(7).empty());
 }

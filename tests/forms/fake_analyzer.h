@@ -1,6 +1,6 @@
 #pragma once
-// Test doubles for the main window model: an analyzer that answers identity and help queries, a
-// bench around it, a scripted person at the screen and timing solvers that record their calls.
+// Test doubles for the main window model: a scripted person at the screen and timing solvers that
+// record their calls. The analyzer is the simulated bench's (form_fixture.h).
 
 #include <functional>
 #include <memory>
@@ -11,98 +11,8 @@
 
 #include "core/timing_solver.h"
 #include "forms/interaction.h"
-#include "instruments/bench.h"
-#include "instruments/instrument_error.h"
 
 namespace zp::test {
-
-struct FakeAnalyzerSetup {
-    std::string modelText = "KT622A";
-    std::string optionText = "K71 M81";
-    int ports = 2;
-    int sources = 1;
-    std::string hardwareValue = "5";
-    std::string helpReply = "\"C:\\Help\\zentra-pulse.html\"\n";
-    // Description of an error the model query raises, when set.
-    std::optional<std::string> modelError;
-    std::optional<std::string> helpError;
-    bool unreachable = false;
-};
-
-struct FakeLog {
-    int connects = 0;
-    int capsReads = 0;
-    std::vector<std::string> commands;
-};
-
-// What every fake part reads its answers from and logs to.
-struct FakeParts {
-    const FakeAnalyzerSetup& s_;
-    FakeLog& log_;
-};
-
-class FakeCaps : public AnalyzerCaps, FakeParts {
-  public:
-    explicit FakeCaps(FakeParts p) : FakeParts(p) {}
-    int portCount() override { return ++log_.capsReads, s_.ports; }
-    int sourceCount() override { return ++log_.capsReads, s_.sources; }
-    std::string hardwareValue() override { return s_.hardwareValue; }
-    double minFrequency() override { return 10e6; }
-    double maxFrequency() override { return 26.5e9; }
-};
-
-class FakeParser : public CommandParser, FakeParts {
-  public:
-    explicit FakeParser(FakeParts p) : FakeParts(p) {}
-    std::string parse(const std::string& command) override {
-        log_.commands.push_back(command);
-        if (s_.helpError) throw InstrumentError(-1, *s_.helpError);
-        return s_.helpReply;
-    }
-};
-
-class FakeAnalyzer : public AnalyzerApplication, FakeParts {
-  public:
-    explicit FakeAnalyzer(FakeParts p) : FakeParts(p) {}
-    std::unique_ptr<Channel> currentChannel() override { return nullptr; }
-    std::unique_ptr<ChannelCollection> channels() override { return nullptr; }
-    void setUpdateSwitch(bool) override {}
-    void setBusSwitch(bool) override {}
-    std::unique_ptr<MessageArea> messageArea() override { return nullptr; }
-    std::unique_ptr<CommandParser> commandParser() override {
-        return std::make_unique<FakeParser>(FakeParts{s_, log_});
-    }
-    std::string modelText() override {
-        if (s_.modelError) throw InstrumentError(-999, *s_.modelError);
-        return s_.modelText;
-    }
-    std::string optionText() override { return s_.optionText; }
-    std::unique_ptr<AnalyzerCaps> hardwareInfo() override {
-        return std::make_unique<FakeCaps>(FakeParts{s_, log_});
-    }
-    std::unique_ptr<Measurement> activeMeasurement() override { return nullptr; }
-    void setTriggerSource(int) override {}
-    void setTriggerMode(int) override {}
-    void acquirePoint(bool, bool) override {}
-};
-
-class FakeBench : public Bench {
-  public:
-    FakeAnalyzerSetup setup;
-    FakeLog log;
-
-    std::unique_ptr<AnalyzerApplication> connectAnalyzer() override {
-        ++log.connects;
-        if (setup.unreachable) throw InstrumentError(-2147221005, "Analyzer not reachable");
-        return std::make_unique<FakeAnalyzer>(FakeParts{setup, log});
-    }
-    std::unique_ptr<InstrumentBus> createBus() override {
-        throw InstrumentError(kOwnCheckError, "no bus on the fake bench");
-    }
-    IoTrace* trace() override { return nullptr; }
-    std::string describe() const override { return "fake analyzer"; }
-    bool simulated() const override { return false; }
-};
 
 class ScriptedInteraction : public Interaction {
   public:

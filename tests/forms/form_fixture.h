@@ -1,55 +1,65 @@
 #pragma once
-// A main window model on a fake analyzer, loaded for one of the test bench models.
+// A main window model on the simulated bench, loaded for one of its analyzer models.
 
 #include <gtest/gtest.h>
 
+#include <memory>
 #include <string>
+#include <string_view>
+#include <utility>
 
 #include "core/pulsed_module.h"
 #include "fake_analyzer.h"
 #include "forms/main_form.h"
+#include "instruments/io_trace.h"
+#include "sim/sim_bench.h"
 
 namespace zp::test {
 
-inline FakeAnalyzerSetup analyzer(std::string model, std::string options, int ports = 2,
-                                  int sources = 1, std::string hardwareValue = "5") {
-    FakeAnalyzerSetup s;
-    s.modelText = std::move(model);
-    s.optionText = std::move(options);
-    s.ports = ports;
-    s.sources = sources;
-    s.hardwareValue = std::move(hardwareValue);
-    return s;
-}
+// Simulated models by what the window makes of them.
+inline constexpr const char* kTwoPortExternal = "kt611";   // listed, no internal generators
+inline constexpr const char* kTwoPortInternal = "kt622";   // internal generators, 100 MHz clock
+inline constexpr const char* kTwoPortSlowClock = "kt633";  // internal generators, 60 MHz clock
+inline constexpr const char* kFourPortThreeSources = "kt655";
+inline constexpr const char* kUnlisted = "zx20-j55";
 
-// Listed two-port model with external generators (no internal pulse generator option).
-inline FakeAnalyzerSetup twoPortExternal() {
-    return analyzer("KT622A", "M81");
-}
-// Listed two-port model with the internal pulse generators in use.
-inline FakeAnalyzerSetup twoPortInternal() {
-    return analyzer("KT622A", "K71 M81");
-}
-inline FakeAnalyzerSetup fourPortThreeSources() {
-    return analyzer("KT655A", "K71 M83 M84", 4, 3, "5.0");
-}
-inline FakeAnalyzerSetup unlisted() {
-    return analyzer("ZX20", "J55");
-}
+// The simulated bench of one model at a time, so that a window can be started again on another.
+class ModelBench : public Bench {
+  public:
+    explicit ModelBench(std::string_view model = kTwoPortExternal, sim::SimFaults faults = {}) {
+        use(model, std::move(faults));
+    }
+    void use(std::string_view model, sim::SimFaults faults = {}) {
+        sim_ = std::make_unique<sim::SimBench>(model, std::move(faults));
+    }
+    sim::SimBench& sim() { return *sim_; }
+    std::vector<std::string> lines() { return sim_->trace()->lines(); }
+
+    std::unique_ptr<AnalyzerApplication> connectAnalyzer() override {
+        return sim_->connectAnalyzer();
+    }
+    std::unique_ptr<InstrumentBus> createBus() override { return sim_->createBus(); }
+    IoTrace* trace() override { return sim_->trace(); }
+    std::string describe() const override { return sim_->describe(); }
+    bool simulated() const override { return sim_->simulated(); }
+
+  private:
+    std::unique_ptr<sim::SimBench> sim_;
+};
 
 class FormTest : public ::testing::Test {
   protected:
     PulsedModule state;
-    FakeBench bench;
+    ModelBench bench;
     ScriptedInteraction ui;
     SolverScript solver;
     MainForm form{state, bench, ui, recordingFactory(solver)};
 
-    void load(const FakeAnalyzerSetup& setup) {
-        bench.setup = setup;
+    void load(std::string_view model) {
+        bench.use(model);
         form.Form_Load();
     }
-    void SetUp() override { load(twoPortExternal()); }
+    void SetUp() override { form.Form_Load(); }
     // Types a value into a field as a person would; the entry must be accepted.
     static void type(EntryField& field, double v, ChangeSource how = ChangeSource::Typed) {
         ASSERT_EQ(field.enter(v, how), std::nullopt) << field.name() << " refused " << v;

@@ -58,8 +58,8 @@ TEST_F(MainFormJson, OneLinePerControlInTableOrderThenStatusAndState) {
                "true, ",
                "\n \"m_NoSWGating\": {\"caption\": \"No &SW Gating\", \"checked\": false, "
                "\"enabled\": true, \"visible\": true},\n",
-               "\n \"status\": {\"model\": \"KT622A\", \"options\": \"M81\", \"simulated\": "
-               "false, \"needsCalculation\": true, \"text\": \"KT622A M81 - Calculate "
+               "\n \"status\": {\"model\": \"KT611A\", \"options\": \"\", \"simulated\": "
+               "true, \"needsCalculation\": true, \"text\": \"KT611A (simulated) - Calculate "
                "needed\"},\n"});
     EXPECT_EQ(text.substr(text.size() - 4), "}\n}\n");
 
@@ -72,11 +72,11 @@ TEST_F(MainFormJson, OneLinePerControlInTableOrderThenStatusAndState) {
     form.b_calculate_Click();
     const QJsonObject status = parsed(mainFormJson(form))["status"].toObject();
     EXPECT_FALSE(status["needsCalculation"].toBool());
-    EXPECT_EQ(str(status["text"]), "KT622A M81 - Calculated");
+    EXPECT_EQ(str(status["text"]), "KT611A (simulated) - Calculated");
 }
 
 TEST_F(MainFormJson, StateCarriesTheSetupAndFullPrecision) {
-    load(fourPortThreeSources());
+    load(kFourPortThreeSources);
     form.VexoEdit_delay[5].setValue(9.444444444444445e-6);
     const std::string text = mainFormJson(form);
     EXPECT_NE(text.find("{\"value\": 9.444444444444445e-06, "), std::string::npos);

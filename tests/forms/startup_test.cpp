@@ -1,5 +1,7 @@
 // Start-up of the main window: layout by model, enabling, and a failing analyzer.
 
+#include <algorithm>
+
 #include "form_fixture.h"
 #include "instruments/instrument_error.h"
 
@@ -11,7 +13,7 @@ using Startup = FormTest;
 TEST_F(Startup, RowsAndMenusFollowTheModel) {
     struct Case {
         const char* name;
-        FakeAnalyzerSetup setup;
+        const char* model;
         int rows;
         const char* row4;
         const char* lastRow;
@@ -19,15 +21,14 @@ TEST_F(Startup, RowsAndMenusFollowTheModel) {
         bool listed;  // "No SW Gating" enabled, "Pulse Configuration..." shown
     };
     const Case cases[] = {
-        {"two-port", twoPortExternal(), 5, "R2 IF Gate :", "R2 IF Gate :", 7240, true},
-        {"four-port three-source", fourPortThreeSources(), 6, "D IF Gate :", "R IF Gate :", 7600,
+        {"two-port", kTwoPortExternal, 5, "R2 IF Gate :", "R2 IF Gate :", 7240, true},
+        {"four-port three-source", kFourPortThreeSources, 6, "D IF Gate :", "R IF Gate :", 7600,
          true},
-        {"unlisted", unlisted(), 5, "R2 IF Gate :", "R2 IF Gate :", 7240, false},
+        {"unlisted", kUnlisted, 5, "R2 IF Gate :", "R2 IF Gate :", 7240, false},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.name);
-        bench.log = {};
-        load(c.setup);
+        load(c.model);
         ASSERT_EQ(form.rowCount(), c.rows);
         EXPECT_EQ(form.VexoEdit_delay.size(), static_cast<std::size_t>(c.rows));
         EXPECT_EQ(state.NumOutputs, c.rows);
@@ -40,14 +41,22 @@ TEST_F(Startup, RowsAndMenusFollowTheModel) {
         EXPECT_EQ(form.m_PulseConfig.visible, c.listed);
         EXPECT_EQ(form.m_PulseConfig.enabled, c.listed);
         // Port and source counts are read for listed models only.
-        EXPECT_EQ(bench.log.capsReads > 0, c.listed);
+        const std::vector<std::string> lines = bench.lines();
+        EXPECT_EQ(
+            std::ranges::any_of(
+                lines, [](const std::string& l) { return l.starts_with("ANA Caps.portCount()"); }),
+            c.listed);
     }
 }
 
 TEST_F(Startup, SixthRowIsAFullRow) {
-    load(fourPortThreeSources());
+    load(kFourPortThreeSources);
     EXPECT_EQ(form.controls().fieldGeometry("VexoEdit_width(5)").top, 2280);
     EXPECT_EQ(form.b_close.geometry.top, 6240);
+    // The bottom buttons in their slots, first and last.
+    const std::pair<const Control&, int> lefts[] = {
+        {form.b_PulseProfile, 120}, {form.b_min, 3180}, {form.b_close, 4200}};
+    for (const auto& [button, left] : lefts) EXPECT_EQ(button.geometry.left, left) << button.name;
     type(form.VexoEdit_width[5], 2e-6);
     EXPECT_EQ(form.VexoEdit_width[5].value(), 2e-6);
 }
@@ -67,8 +76,8 @@ TEST_F(Startup, ApplyAndProfileStartDisabledWithFixedPrfInForce) {
 TEST_F(Startup, SecondLoadStartsFromTheDesignedWindow) {
     typePrf(12345);
     form.m_NoPG_Click();
-    load(fourPortThreeSources());
-    load(twoPortExternal());
+    load(kFourPortThreeSources);
+    load(kTwoPortExternal);
     EXPECT_EQ(form.rowCount(), 5);
     EXPECT_EQ(form.f_PulsedZentra.geometry.height, 7240);
     EXPECT_EQ(form.VexoEdit_prf.value(), 5000);
@@ -77,26 +86,22 @@ TEST_F(Startup, SecondLoadStartsFromTheDesignedWindow) {
 }
 
 TEST(FailingStartup, AnalyzerErrorPropagatesAndLeavesTheStateAlone) {
-    FakeAnalyzerSetup modelError = fourPortThreeSources();
-    modelError.modelError = "-999 Analyzer not responding";
-    FakeAnalyzerSetup unreachable;
-    unreachable.unreachable = true;
-    for (const FakeAnalyzerSetup& setup : {modelError, unreachable}) {
-        SCOPED_TRACE(setup.unreachable ? "unreachable" : "model query fails");
+    for (const char* fault : {"analyzer:Application.modelText=-999 Analyzer not responding",
+                              "analyzer:Caps.portCount=-999 Analyzer not responding"}) {
+        SCOPED_TRACE(fault);
         PulsedModule state;
         state.PRF = 777.0;
         state.NumOutputs = 3;
-        FakeBench bench;
-        bench.setup = setup;
+        sim::SimFaults faults;
+        faults.add(fault);
+        ModelBench bench(kFourPortThreeSources, faults);
         ScriptedInteraction ui;
         MainForm form{state, bench, ui, makePassThroughSolver};
         try {
             form.Form_Load();
             ADD_FAILURE() << "start-up went on without an analyzer";
         } catch (const InstrumentError& e) {
-            if (!setup.unreachable) {
-                EXPECT_EQ(e.description(), "-999 Analyzer not responding");
-            }
+            EXPECT_EQ(e.description(), "-999 Analyzer not responding");
         }
         EXPECT_EQ(state.PRF, 777.0);
         EXPECT_EQ(state.NumOutputs, 3);

@@ -201,8 +201,7 @@ TEST(MainWindow, UnbuiltActionsInformFailuresWarnAndHandlersPlugIntoTheModel) {
 
 TEST(MainWindow, RowsAreBoundOnceAndDroppedRowsLoseTheirWidgets) {
     PulsedModule state;
-    zp::test::FakeBench bench;
-    bench.setup = zp::test::fourPortThreeSources();
+    zp::test::ModelBench bench(zp::test::kFourPortThreeSources);
     QtInteraction ui({});
     ui.setUnattended(true);
     MainForm form(state, bench, ui, zp::test::makePassThroughSolver);
@@ -212,14 +211,14 @@ TEST(MainWindow, RowsAreBoundOnceAndDroppedRowsLoseTheirWidgets) {
     const QPointer<NumericEntry> sixth = window.findChild<NumericEntry*>("VexoEdit_width(5)");
     ASSERT_TRUE(first && sixth);
 
-    bench.setup = zp::test::twoPortExternal();
+    bench.use(zp::test::kTwoPortExternal);
     form.Form_Load();
     EXPECT_EQ(window.shownRows(), 5);
     QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
     EXPECT_TRUE(sixth.isNull());
     EXPECT_EQ(window.findChild<QLabel*>("lbl_gate(4)")->text(), "R2 IF Gate :");
 
-    bench.setup = zp::test::fourPortThreeSources();
+    bench.use(zp::test::kFourPortThreeSources);
     form.Form_Load();
     EXPECT_EQ(window.shownRows(), 6);
     EXPECT_EQ(window.findChild<NumericEntry*>("VexoEdit_width(0)"), first.data());
