@@ -15,7 +15,7 @@ fi
 echo "run: no display; running the main job headless with zentra-pulse-cli"
 mkdir -p out
 "$bin/zentra-pulse-cli" --trace-io out/io-trace.log "$@" \
-  set prf 10k set ifbw 1k set width 0 2us calculate show >out/main-form.json.tmp
+  set prf 10k set ifbw 1k set width 0 2us calculate apply show >out/main-form.json.tmp
 # The echo lines come first; the JSON object starts at the first "{" line.
 sed -n '/^{/,$p' out/main-form.json.tmp >out/main-form.json
 sed -n '/^{/q;p' out/main-form.json.tmp
